@@ -1,0 +1,44 @@
+# Entry points. Each one installs what is missing (scripts/setup) before it builds.
+BUILD ?= build
+JOBS ?= $(shell nproc)
+CMAKE_FLAGS ?=
+
+.PHONY: all setup configure build run test bench fuzz clean format
+
+all: build
+
+setup:
+	@scripts/setup
+
+$(BUILD)/CMakeCache.txt:
+	@scripts/setup
+	cmake -S . -B $(BUILD) $(CMAKE_FLAGS)
+
+configure: $(BUILD)/CMakeCache.txt
+
+build: setup configure
+	cmake --build $(BUILD) -j $(JOBS)
+
+run: build
+	@mkdir -p out
+	$(BUILD)/bin/anvil export demo $(foreach e,$(shell $(BUILD)/bin/anvil formats --extensions),-o out/demo.$(e))
+	@ls -l out
+
+test: build
+	cd $(BUILD) && ctest --output-on-failure -j $(JOBS)
+
+bench: setup
+	cmake -S . -B $(BUILD)-bench -DCMAKE_BUILD_TYPE=Release -DANVIL_TESTS=OFF -DANVIL_BENCH=ON
+	cmake --build $(BUILD)-bench -j $(JOBS)
+	@for b in $(BUILD)-bench/bin/bench_*; do echo "== $$b"; $$b; done
+
+fuzz: setup
+	cmake -S . -B $(BUILD)-fuzz -DCMAKE_CXX_COMPILER=clang++ -DANVIL_TESTS=OFF -DANVIL_FUZZ=ON
+	cmake --build $(BUILD)-fuzz -j $(JOBS)
+	@echo "fuzz targets in $(BUILD)-fuzz/bin/fuzz_*"
+
+format:
+	git ls-files '*.cpp' '*.h' | xargs clang-format -i
+
+clean:
+	rm -rf $(BUILD) $(BUILD)-bench $(BUILD)-fuzz out
