@@ -1,0 +1,30 @@
+#include "ISceneReader.h"
+#include <algorithm>
+#include <cctype>
+#include <filesystem>
+
+namespace AnvilCore {
+
+SceneReaderRegistry& SceneReaderRegistry::instance() {
+  static SceneReaderRegistry s_registry;
+  return s_registry;
+}
+
+void SceneReaderRegistry::add(std::unique_ptr<ISceneReader> i_pReader) {
+  m_readers.push_back(std::move(i_pReader));
+}
+
+ISceneReader* SceneReaderRegistry::find(const std::string& i_path) const {
+  std::string ext = std::filesystem::path(i_path).extension().string();
+  if (ext.empty()) return nullptr;
+  ext.erase(0, 1);
+  std::transform(ext.begin(), ext.end(), ext.begin(),
+                 [](unsigned char c) { return static_cast<char>(std::tolower(c)); });
+  for (const auto& pReader : m_readers) {
+    const auto exts = pReader->extensions();
+    if (std::find(exts.begin(), exts.end(), ext) != exts.end()) return pReader.get();
+  }
+  return nullptr;
+}
+
+} // namespace AnvilCore

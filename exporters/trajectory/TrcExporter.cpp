@@ -1,0 +1,154 @@
+#include "TrcExporter.h"
+#include "plugin/host/Character.h"
+#include "plugin/host/Database.h"
+#include "plugin/host/HInterface.h"
+#include "plugin/host/HTimeManager.h"
+#include "plugin/host/Marker.h"
+#include "plugin/host/OperationStack.h"
+#include <cstring>
+#include <string>
+
+namespace {
+const char* const kSection = "TRCExporter";
+
+// Appends one "\t%f\t%f\t%f" triple, or the three tabs of a gap. A node that is not a marker
+// has a value at every time.
+void appendPosition(std::string& io_rLine, const Node* i_pNode, HTime i_t) {
+  if (i_pNode->isKindOf(&Marker::s_classMarker) &&
+      !static_cast<const Marker*>(i_pNode)->m_track.hasKeyAt(i_t)) {
+    io_rLine += "\t\t\t";
+    return;
+  }
+  const Vec3 p = i_pNode->getWSPos(i_t);
+  char text[160];
+  const int n = std::snprintf(text, sizeof text, "\t%f\t%f\t%f", p.x, p.y, p.z);
+  io_rLine.append(text, n > 0 ? static_cast<size_t>(n) : 0);
+}
+} // namespace
+
+TrcExporter* TrcExporter::createInstance() { return new TrcExporter(); }
+
+TrcExporter::TrcExporter() : FileExporter(false, "trc", false), m_markers(16), m_extraNodes(16) {}
+
+bool TrcExporter::getOptions(void* o_pOptions) {
+  std::memcpy(o_pOptions, &m_options, sizeof m_options);
+  return true;
+}
+
+bool TrcExporter::setOptions(void* i_pOptions) {
+  std::memcpy(&m_options, i_pOptions, sizeof m_options);
+  return true;
+}
+
+bool TrcExporter::recognize(const HString& i_rFilename) {
+  return extractExtension(i_rFilename) == "trc";
+}
+
+void TrcExporter::loadUserSetup() {
+  const HString& scope = HString::EMPTY_STRING;
+  // "WriteUnlabelled" defaults to the write-subjects flag, not to its own value.
+  m_options.m_writeUnlabelled =
+      g_interface.getUserSetupInt(kSection, "WriteUnlabelled", m_options.m_writeSubjects, scope) !=
+      0;
+  m_options.m_writeSubjects = g_interface.getUserSetupInt(kSection, "ExportSubjectNames",
+                                                          m_options.m_writeSubjects, scope) != 0;
+  m_options.m_removeLeadingUnderscores =
+      g_interface.getUserSetupInt(kSection, "RemoveLeadingUnderscores",
+                                  m_options.m_removeLeadingUnderscores, scope) != 0;
+  m_options.m_collapseSubjects = g_interface.getUserSetupInt(
+                                     kSection, "CollapseSubjectNames",
+                                     m_options.m_collapseSubjects, scope) != 0;
+}
+
+void TrcExporter::saveUserSetup() const {
+  const HString& scope = HString::EMPTY_STRING;
+  g_interface.setUserSetupInt(kSection, "WriteUnlabelled", m_options.m_writeUnlabelled, scope);
+  g_interface.setUserSetupInt(kSection, "ExportSubjectNames", m_options.m_writeSubjects, scope);
+  g_interface.setUserSetupInt(kSection, "RemoveLeadingUnderscores",
+                              m_options.m_removeLeadingUnderscores, scope);
+  g_interface.setUserSetupInt(kSection, "CollapseSubjectNames", m_options.m_collapseSubjects,
+                              scope);
+}
+
+bool TrcExporter::editOptions(void*) {
+  // This host has no options dialog; options change through trcExportOptions.
+  return false;
+}
+
+void TrcExporter::reset() {
+  m_markers.setCount(0);
+  m_extraNodes.setCount(0);
+}
+
+HString TrcExporter::displayName(const Node* i_pMarker) const {
+  const Character* pCharacter = i_pMarker->getCharacterParent();
+  if (!m_options.m_writeSubjects || !pCharacter) return i_pMarker->getName();
+  HString name;
+  if (m_options.m_collapseSubjects) {
+    name = pCharacter->getName() + "_" + i_pMarker->getName();
+  } else {
+    name = ModulePath(i_pMarker).getPartialPathString();
+    name.Replace("\\", ":");
+  }
+  if (m_options.m_removeLeadingUnderscores && !name.IsEmpty() && name[0] == '_') name = name.Mid(1);
+  return name;
+}
+
+bool TrcExporter::write() {
+  for (Module* pModule : m_modules)
+    if (pModule->isKindOf(&Marker::s_classMarker)) m_markers.add(static_cast<Node*>(pModule));
+  writeHeader();
+  writeFrames();
+  return true;
+}
+
+void TrcExporter::writeHeader() {
+  const int markers = m_markers.getCount();
+  const int frames = m_timeRange.getNumFrames();
+  const double rate = HTimeManager::getInstance()->getFrameRate();
+  std::fprintf(m_pFile, "PathFileType\t4\t(X/Y/Z)\t%s\n", m_filePath.GetStr());
+  std::fprintf(m_pFile, "DataRate\tCameraRate\tNumFrames\tNumMarkers\tUnits\tOrigDataRate\t"
+                        "OrigDataStartFrame\tOrigNumFrames\n");
+  std::fprintf(m_pFile, "%f\t", rate);
+  std::fprintf(m_pFile, "%f\t", rate);
+  std::fprintf(m_pFile, "%d\t", frames);
+  std::fprintf(m_pFile, "%d\t", markers);
+  std::fprintf(m_pFile, "mm\t");
+  std::fprintf(m_pFile, "%f\t", rate);
+  std::fprintf(m_pFile, "1\t");
+  std::fprintf(m_pFile, "%d\n", frames);
+
+  std::fprintf(m_pFile, "Frame#\tTime\t");
+  for (const Node* pMarker : m_markers) std::fprintf(m_pFile, "%s\t\t\t", displayName(pMarker).GetStr());
+  std::fprintf(m_pFile, "\n");
+
+  std::fprintf(m_pFile, "\t\t");
+  for (int i = 0; i < markers; ++i) std::fprintf(m_pFile, "X%d\tY%d\tZ%d\t", i, i, i);
+  std::fprintf(m_pFile, "\n");
+}
+
+void TrcExporter::writeFrames() {
+  HTimeManager* pTime = HTimeManager::getInstance();
+  const HTime t0 = m_timeRange.getStart();
+  const HTime t1 = m_timeRange.getEnd();
+  const int64_t ticksPerFrame = pTime->getTicksPerFrame();
+  const int frames = t0 > t1 ? 0 : m_timeRange.getNumFrames();
+  // The time column uses the rate the clock implies, not the nominal rate.
+  const double rate = 135000000.0 / double(ticksPerFrame);
+  const double step = 1.0 / rate;
+
+  if (s_doProgress) g_theOperationStack.setTaskRange(0, frames / 10);
+  std::string line;
+  for (int i = 0; i < frames; ++i) {
+    const HTime t = t0 + i * ticksPerFrame;
+    const int frame = pTime->getFrame(t);
+    char text[64];
+    const int n = std::snprintf(text, sizeof text, "%d\t%f", frame, frame * step);
+    line.assign(text, n > 0 ? static_cast<size_t>(n) : 0);
+    for (const Node* pNode : m_markers) appendPosition(line, pNode, t);
+    for (const Node* pNode : m_extraNodes) appendPosition(line, pNode, t);
+    std::fprintf(m_pFile, "%s", line.c_str());
+    std::fprintf(m_pFile, "\n");
+    if (s_doProgress && i % 10 == 0) g_theOperationStack.stepTask();
+  }
+}
