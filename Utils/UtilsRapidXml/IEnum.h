@@ -22,14 +22,16 @@ template <class T> class VEnum final : public IEnum {
 public:
   VEnum(std::string name, std::initializer_list<std::pair<const std::string, T>> keywords)
       : m_Name(std::move(name)), m_ToValue(keywords) {
-    for (const auto& [keyword, value] : m_ToValue) m_ToKeyword.emplace(value, keyword);
+    for (const auto& [keyword, value] : m_ToValue)
+      m_ToKeyword.emplace(value, keyword);
   }
 
   std::string Name() const override { return m_Name; }
   std::vector<std::string> Names() const override {
     std::vector<std::string> names;
     names.reserve(m_ToValue.size());
-    for (const auto& entry : m_ToValue) names.push_back(entry.first);
+    for (const auto& entry : m_ToValue)
+      names.push_back(entry.first);
     return names;
   }
 

@@ -18,8 +18,8 @@ inline char* PoolString(rapidxml::xml_document<>& doc, std::string_view text) {
 /// Appends a new element named `name` to `parent` and returns it.
 inline rapidxml::xml_node<>* AppendElement(rapidxml::xml_document<>& doc,
                                            rapidxml::xml_node<>* parent, std::string_view name) {
-  auto* node = doc.allocate_node(rapidxml::node_element, PoolString(doc, name), nullptr,
-                                 name.size(), 0);
+  auto* node =
+      doc.allocate_node(rapidxml::node_element, PoolString(doc, name), nullptr, name.size(), 0);
   parent->append_node(node);
   return node;
 }

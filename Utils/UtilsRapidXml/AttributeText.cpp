@@ -1,0 +1,145 @@
+#include "Utils/UtilsRapidXml/AttributeText.h"
+
+#include <boost/regex.hpp>
+
+#include <cctype>
+#include <charconv>
+#include <cmath>
+#include <cstdio>
+#include <limits>
+
+namespace UtilsRapidXml {
+
+namespace {
+
+bool IsBlank(char c) {
+  return c == ' ' || c == '\t';
+}
+
+struct VSpecialDouble {
+  std::string_view m_Text;
+  double m_Value;
+};
+
+} // namespace
+
+std::string_view TrimBlanks(std::string_view text) {
+  while (!text.empty() && IsBlank(text.front()))
+    text.remove_prefix(1);
+  while (!text.empty() && IsBlank(text.back()))
+    text.remove_suffix(1);
+  return text;
+}
+
+std::vector<std::string_view> SplitBlanks(std::string_view text) {
+  std::vector<std::string_view> tokens;
+  std::size_t i = 0;
+  while (i < text.size()) {
+    while (i < text.size() && IsBlank(text[i]))
+      ++i;
+    const std::size_t start = i;
+    while (i < text.size() && !IsBlank(text[i]))
+      ++i;
+    if (i > start) tokens.push_back(text.substr(start, i - start));
+  }
+  return tokens;
+}
+
+bool ParseDouble(std::string_view text, double& o_rValue) {
+  const std::string trimmed(TrimBlanks(text));
+  double value = 0.0;
+  int consumed = 0;
+  if (!trimmed.empty() && std::sscanf(trimmed.c_str(), "%lf%n", &value, &consumed) == 1 &&
+      consumed == static_cast<int>(trimmed.size())) {
+    o_rValue = value;
+    return true;
+  }
+  const double inf = std::numeric_limits<double>::infinity();
+  const double qnan = std::numeric_limits<double>::quiet_NaN();
+  static const VSpecialDouble specials[] = {
+      {"1.#INF", inf},     {"-1.#INF", -inf}, {"1.#QNAN", qnan},
+      {"-1.#QNAN", -qnan}, {"1.#IND", -qnan}, {"-1.#IND", -qnan},
+  };
+  for (const auto& special : specials) {
+    if (trimmed == special.m_Text) {
+      o_rValue = special.m_Value;
+      return true;
+    }
+  }
+  return false;
+}
+
+std::string FormatDouble(double value) {
+  char buffer[40];
+  const int n = std::snprintf(buffer, sizeof buffer, "%.17g", value);
+  return n > 0 ? std::string(buffer, static_cast<std::size_t>(n)) : std::string();
+}
+
+bool ParseBool(std::string_view text, bool& o_rValue) {
+  const std::string_view trimmed = TrimBlanks(text);
+  if (trimmed == "0" || trimmed == "1") {
+    o_rValue = trimmed == "1";
+    return true;
+  }
+  std::string lower(trimmed);
+  for (char& c : lower)
+    c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+  if (lower == "true" || lower == "false") {
+    o_rValue = lower == "true";
+    return true;
+  }
+  return false;
+}
+
+bool ParseUnsigned(std::string_view text, std::uint32_t& o_rValue) {
+  const std::string_view trimmed = TrimBlanks(text);
+  std::uint32_t value = 0;
+  const auto [end, error] = std::from_chars(trimmed.data(), trimmed.data() + trimmed.size(), value);
+  if (trimmed.empty() || error != std::errc() || end != trimmed.data() + trimmed.size()) {
+    return false;
+  }
+  o_rValue = value;
+  return true;
+}
+
+bool ParseVersion(std::string_view text, IVersion& o_rVersion) {
+  const std::string_view trimmed = TrimBlanks(text);
+  const auto point = trimmed.find('.');
+  if (point == std::string_view::npos) return false;
+  const std::string_view major = trimmed.substr(0, point);
+  const std::string_view minor = trimmed.substr(point + 1);
+  auto parsePart = [](std::string_view part, std::int32_t& out) {
+    if (part.empty() || !std::isdigit(static_cast<unsigned char>(part.front()))) return false;
+    const auto [end, error] = std::from_chars(part.data(), part.data() + part.size(), out);
+    return error == std::errc() && end == part.data() + part.size();
+  };
+  IVersion version;
+  if (!parsePart(major, version.m_Major) || !parsePart(minor, version.m_Minor)) return false;
+  o_rVersion = version;
+  return true;
+}
+
+bool SplitExpressionList(std::string_view text, std::vector<std::string>& o_rTokens) {
+  static const boost::regex token("(-?'[^']*'[^ ]*|[^ ]+)[ ]*(.+)?");
+  std::vector<std::string> tokens;
+  std::string rest(TrimBlanks(text));
+  while (!rest.empty()) {
+    boost::smatch match;
+    if (!boost::regex_match(rest, match, token)) return false;
+    tokens.push_back(match[1].str());
+    rest = match[2].matched ? match[2].str() : std::string();
+  }
+  o_rTokens = std::move(tokens);
+  return true;
+}
+
+bool HasUnquotedBlank(std::string_view expression) {
+  bool quoted = false;
+  for (char c : expression) {
+    if (c == '\'') quoted = !quoted;
+    if (!quoted && IsBlank(c)) return true;
+  }
+  return false;
+}
+
+} // namespace UtilsRapidXml

@@ -1,0 +1,43 @@
+#pragma once
+// Text forms of attribute values: parsing and printing of numbers, flags, versions and lists.
+// All parsers return false on a text that does not convert and leave their output alone.
+
+#include "Utils/UtilsRapidXml/IVersion.h"
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace UtilsRapidXml {
+
+/// `text` without leading and trailing blanks and tabs.
+std::string_view TrimBlanks(std::string_view text);
+
+/// Splits at runs of blanks and tabs; an empty or blank text gives no tokens.
+std::vector<std::string_view> SplitBlanks(std::string_view text);
+
+/// A double: trimmed, then the whole text must scan as a floating-point number. Also accepts
+/// "1.#INF", "-1.#INF" (infinities), "1.#QNAN" (quiet NaN), "-1.#QNAN", "1.#IND" and "-1.#IND"
+/// (negative quiet NaN).
+bool ParseDouble(std::string_view text, double& o_rValue);
+
+/// "%.17g": round-trips every double; non-finite values print as inf, -inf, nan, -nan.
+std::string FormatDouble(double value);
+
+/// Trimmed "0" / "1", else case-insensitive "true" / "false".
+bool ParseBool(std::string_view text, bool& o_rValue);
+
+/// Two decimal integers separated by a point, such as "3.5".
+bool ParseVersion(std::string_view text, IVersion& o_rVersion);
+
+/// Unsigned decimal integer that fits 32 bits.
+bool ParseUnsigned(std::string_view text, std::uint32_t& o_rValue);
+
+/// Splits a list of expressions at blanks, keeping single-quoted parts (which may hold blanks)
+/// inside their token. False when the text can't be split.
+bool SplitExpressionList(std::string_view text, std::vector<std::string>& o_rTokens);
+
+/// Whether `expression` holds a blank outside single quotes.
+bool HasUnquotedBlank(std::string_view expression);
+
+} // namespace UtilsRapidXml
