@@ -3,6 +3,7 @@
 #include <functional>
 #include <map>
 #include <memory>
+#include <optional>
 #include <nlohmann/json.hpp>
 #include <string>
 #include <vector>
@@ -19,8 +20,11 @@ struct SceneJsonContext {
   std::vector<std::function<void()>> commits;
   /// Top-level modules by name, for sections that refer to subjects or nodes.
   std::map<std::string, Module*> byName;
-  double frameRate = 0.0; ///< the file's rate once "time" is read (0 before)
+  /// The rate frames are counted at: the file's "time" rate, else the scene's current one.
+  double frameRate = 0.0;
   int64_t ticksPerFrame = 0;
+  /// Whether the file gave an animation range; if not, it becomes the span of the keys read.
+  bool animRangeSet = false;
 };
 
 /// Thrown by the helpers below; carries the JSON path ("/markers/3/positions/12") and a text.
@@ -56,6 +60,12 @@ struct SceneSectionRegistration {
     SceneSectionRegistry::instance().add(i_pKey, i_order, std::move(i_reader));
   }
 };
+
+/// The span of every key under `i_rRoot`, or nothing when there are none.
+std::optional<HTimeRange> keySpan(Module& i_rRoot);
+/// Makes the animation and play ranges cover `i_rSpan` (only it, when the scene was empty).
+/// Readers call this before adding their modules.
+void extendAnimRange(const HTimeRange& i_rSpan);
 
 /// Reads a scene file's text into the scene. `i_source` names the file in messages.
 bool readSceneJson(const std::string& i_text, const std::string& i_source, std::string& o_rError);

@@ -1,0 +1,60 @@
+#include "SceneSummary.h"
+#include "plugin/host/Character.h"
+#include "plugin/host/Database.h"
+#include "plugin/host/HTimeManager.h"
+#include "plugin/host/Marker.h"
+#include "plugin/host/SubjectManager.h"
+#include <cstdio>
+#include <string>
+#include <vector>
+
+namespace AnvilCore {
+
+namespace {
+std::string frames(const HTimeRange& i_rRange) {
+  const HTimeManager* pTime = g_db->getTimeManager();
+  return std::to_string(pTime->getFrame(i_rRange.getStart())) + ".." +
+         std::to_string(pTime->getFrame(i_rRange.getEnd())) + " (" +
+         std::to_string(i_rRange.getNumFrames()) + " frames)";
+}
+
+void nameList(std::ostream& o_rOut, const char* i_pTitle, const std::vector<std::string>& i_names) {
+  o_rOut << i_pTitle << ": " << i_names.size();
+  if (!i_names.empty()) {
+    o_rOut << "\n ";
+    for (const std::string& name : i_names) o_rOut << ' ' << name;
+  }
+  o_rOut << '\n';
+}
+} // namespace
+
+void describeScene(std::ostream& o_rOut) {
+  const HTimeManager* pTime = g_db->getTimeManager();
+  char rate[64];
+  std::snprintf(rate, sizeof rate, "%g", pTime->getFrameRate());
+  o_rOut << "scene: " << (g_db->getSceneName().IsEmpty() ? "(unnamed)" : g_db->getSceneName().GetStr())
+         << '\n'
+         << "frame rate: " << rate << " Hz\n"
+         << "animation range: " << frames(pTime->getAnimRange()) << '\n'
+         << "play range: " << frames(pTime->getPlayRange()) << '\n'
+         << "up axis: " << (g_db->isZUp() ? "Z" : "Y") << '\n';
+
+  std::vector<std::string> labelled, unlabelled;
+  for (Module* p : g_db->getModules()) {
+    if (!p->isKindOf(&Marker::s_classMarker)) continue;
+    const Marker* pMarker = static_cast<const Marker*>(p);
+    (pMarker->isUnlabeled() ? unlabelled : labelled).push_back(p->getPartialPathString().GetStr());
+  }
+  nameList(o_rOut, "labelled markers", labelled);
+  nameList(o_rOut, "unlabelled markers", unlabelled);
+
+  std::vector<std::string> subjects;
+  const SubjectManager* pSubjects = g_db->getSubjectManager();
+  for (int i = 0; i < pSubjects->getNumSubjects(); ++i) {
+    const Character* pSubject = pSubjects->getSubject(i);
+    subjects.push_back(std::string(pSubject->getName().GetStr()) + (pSubject->isProp() ? " (prop)" : ""));
+  }
+  nameList(o_rOut, "subjects", subjects);
+}
+
+} // namespace AnvilCore

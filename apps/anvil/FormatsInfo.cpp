@@ -1,0 +1,45 @@
+#include "ModuleLoader.h"
+#include "Subcommands.h"
+#include "AnvilCore/SceneSummary.h"
+#include "AnvilCore/io/SceneInputs.h"
+#include "plugin/host/Database.h"
+#include "plugin/host/FileExporter.h"
+#include <cstdio>
+#include <iostream>
+
+namespace anvil {
+
+int runFormats(const CommonArgs& i_rCommon, bool i_extensionsOnly) {
+  LoadedModule module;
+  std::string error;
+  if (!module.load(i_rCommon.modulePath, error)) {
+    printError(error);
+    return EExitUsage;
+  }
+  FileExporterMgr* pMgr = g_db->getFileExporterMgr();
+  if (i_extensionsOnly) {
+    for (int i = 0; i < pMgr->getNumExporters(); ++i)
+      std::printf("%s%s", i ? " " : "", pMgr->getExporterAt(i)->getExtension().GetStr());
+    std::printf("\n");
+    return EExitOk;
+  }
+  std::printf("%-6s %-34s %-9s %s\n", "ext", "description", "data type", "editable options");
+  for (int i = 0; i < pMgr->getNumExporters(); ++i) {
+    FileExporter* p = pMgr->getExporterAt(i);
+    std::printf("%-6s %-34s %-9d %s\n", p->getExtension().GetStr(), p->getDescription().GetStr(),
+                p->getDataType(), p->hasEditableOptions() ? "yes" : "no");
+  }
+  return EExitOk;
+}
+
+int runInfo(const CommonArgs&, const std::vector<std::string>& i_inputs) {
+  std::string error;
+  if (!AnvilCore::loadSceneInputs(i_inputs, error)) {
+    printError(error);
+    return EExitUsage;
+  }
+  AnvilCore::describeScene(std::cout);
+  return EExitOk;
+}
+
+} // namespace anvil

@@ -1,0 +1,36 @@
+#pragma once
+#include <string>
+
+class CommandPluginBase;
+class ExporterPluginBase;
+
+namespace anvil {
+
+/// The export module, loaded with dlopen, with both plug-ins taken and their exporters handed to
+/// the host's `FileExporterMgr`.
+class LoadedModule {
+public:
+  LoadedModule() = default;
+  LoadedModule(const LoadedModule&) = delete;
+  LoadedModule& operator=(const LoadedModule&) = delete;
+  /// Releases the exporters and both plug-ins while the module's code is still loaded.
+  ~LoadedModule();
+
+  /// Loads the module at `i_path` (empty: next to the program). On failure returns false with a
+  /// message in `o_rError`.
+  bool load(const std::string& i_path, std::string& o_rError);
+  ExporterPluginBase* exporterPlugin() const { return m_pExporters; }
+  CommandPluginBase* commandPlugin() const { return m_pCommands; }
+  const std::string& path() const { return m_path; }
+
+  /// Where the module is looked for when no path is given.
+  static std::string defaultPath();
+
+private:
+  void* m_pHandle = nullptr;
+  ExporterPluginBase* m_pExporters = nullptr;
+  CommandPluginBase* m_pCommands = nullptr;
+  std::string m_path;
+};
+
+} // namespace anvil

@@ -1,0 +1,48 @@
+// anvil: loads the export module, reads scenes and exports them.
+#include "Subcommands.h"
+#include <CLI/CLI.hpp>
+#include <iostream>
+
+int main(int argc, char** argv) {
+  using namespace anvil;
+  CLI::App app{"anvil: export motion-capture scenes with the AnvilFileExport module"};
+  app.require_subcommand(1);
+  CommonArgs common;
+  app.add_option("--module", common.modulePath, "Path of libAnvilFileExport.so");
+  app.add_option("--user-setup", common.userSetupPath,
+                 "User setup file (default $XDG_CONFIG_HOME/anvil/usersetup.ini)");
+  app.add_flag("-v,--verbose", common.verbose, "Show informational log lines");
+
+  ExportArgs exportArgs;
+  CLI::App* pExport = app.add_subcommand("export", "Load inputs into one scene and export it");
+  pExport->add_option("inputs", exportArgs.inputs, "'demo' or scene files")->required();
+  pExport->add_option("-o,--output", exportArgs.outputs, "Output file; the extension picks the exporter")
+      ->required();
+  pExport->add_option("--range", exportArgs.range, "Frames to export, FIRST:LAST");
+  pExport->add_flag("--selected", exportArgs.selectedOnly, "Export only selected modules");
+  pExport->add_option("--module", common.modulePath, "Path of libAnvilFileExport.so");
+  pExport->add_option("--user-setup", common.userSetupPath, "User setup file");
+
+  bool extensionsOnly = false;
+  CLI::App* pFormats = app.add_subcommand("formats", "List the registered exporters");
+  pFormats->add_flag("--extensions", extensionsOnly, "Print only the extensions, space-separated");
+  pFormats->add_option("--module", common.modulePath, "Path of libAnvilFileExport.so");
+
+  std::vector<std::string> infoInputs;
+  CLI::App* pInfo = app.add_subcommand("info", "Summarise a scene");
+  pInfo->add_option("inputs", infoInputs, "'demo' or scene files")->required();
+
+  try {
+    app.parse(argc, argv);
+  } catch (const CLI::ParseError& e) {
+    if (e.get_exit_code() == 0) return app.exit(e);
+    app.exit(e);
+    return EExitUsage;
+  }
+
+  installLogSink(common.verbose);
+  if (pExport->parsed()) return runExport(common, exportArgs);
+  if (pFormats->parsed()) return runFormats(common, extensionsOnly);
+  if (pInfo->parsed()) return runInfo(common, infoInputs);
+  return EExitUsage;
+}
