@@ -1,4 +1,6 @@
 #include "AnvilFileExporterCommandsPlugin.h"
+#include "commands/TrcExportOptionsCmd.h"
+#include <new>
 
 AnvilFileExporterCommandsPlugin* AnvilFileExporterCommandsPlugin::createInstance() {
   return new AnvilFileExporterCommandsPlugin();
@@ -6,5 +8,6 @@ AnvilFileExporterCommandsPlugin* AnvilFileExporterCommandsPlugin::createInstance
 
 bool AnvilFileExporterCommandsPlugin::loadCommands() {
   // Option commands join here, in the host's order, as their exporters gain them.
+  m_commands.add(new (std::nothrow) TrcExportOptionsCmd());
   return true;
 }
