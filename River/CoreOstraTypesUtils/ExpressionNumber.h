@@ -1,0 +1,11 @@
+#pragma once
+
+#include <string>
+
+namespace CoreOstraTypesUtils {
+
+/// A number as expression text: "%.*g" with precision 17, and "nan", "-nan", "inf", "-inf" for
+/// the non-finite values whatever the platform's printf does.
+std::string FormatExpressionNumber(double value);
+
+} // namespace CoreOstraTypesUtils
