@@ -1,8 +1,10 @@
 #include "plugin/host/Database.h"
 #include "SceneRotation.h"
+#include "plugin/host/CalibrationMgr.h"
 #include "plugin/host/Character.h"
 #include "plugin/host/FileExporter.h"
 #include "plugin/host/HTimeManager.h"
+#include "plugin/host/OpticalCamera.h"
 #include "plugin/host/SubjectManager.h"
 #include <cstdarg>
 #include <cstdio>
@@ -37,13 +39,15 @@ Database::Database()
     : m_pRoot(std::make_unique<Module>("Scene")),
       m_pExporterMgr(std::make_unique<FileExporterMgr>()),
       m_pTimeManager(std::make_unique<HTimeManager>()),
-      m_pSubjectManager(std::make_unique<SubjectManager>()), m_logSink(defaultSink) {}
+      m_pSubjectManager(std::make_unique<SubjectManager>()),
+      m_pCalibrationMgr(std::make_unique<CalibrationMgr>()), m_logSink(defaultSink) {}
 
 Database::~Database() = default;
 
 FileExporterMgr* Database::getFileExporterMgr() { return m_pExporterMgr.get(); }
 HTimeManager* Database::getTimeManager() { return m_pTimeManager.get(); }
 SubjectManager* Database::getSubjectManager() { return m_pSubjectManager.get(); }
+CalibrationMgr* Database::getCalibrationMgr() { return m_pCalibrationMgr.get(); }
 
 HString Database::getScratchPath() const {
   std::error_code ec;
@@ -101,6 +105,7 @@ void Database::clearScene() {
   recomputeSceneMatrix();
   m_zUp = true;
   m_sceneName = HString();
+  *m_pCalibrationMgr = CalibrationMgr();
   invalidate();
 }
 
@@ -108,9 +113,13 @@ void Database::rebuildCache() const {
   if (m_cacheValid) return;
   m_modules.clear();
   m_nodes.clear();
+  m_opticalCameras.clear();
   for (int i = 0; i < m_pRoot->getNumChildren(); ++i) m_pRoot->getChild(i)->collect(m_modules);
-  for (Module* p : m_modules)
+  for (Module* p : m_modules) {
     if (p->isKindOf(&Node::s_classNode)) m_nodes.push_back(static_cast<Node*>(p));
+    if (p->isKindOf(&OpticalCamera::s_classOpticalCamera))
+      m_opticalCameras.push_back(static_cast<OpticalCamera*>(p));
+  }
   m_cacheValid = true;
 }
 
@@ -127,6 +136,18 @@ int Database::getNumNodes() const {
 Node* Database::getNode(int i_index) const {
   rebuildCache();
   return (i_index >= 0 && size_t(i_index) < m_nodes.size()) ? m_nodes[size_t(i_index)] : nullptr;
+}
+
+int Database::getNumOpticalCameras() const {
+  rebuildCache();
+  return static_cast<int>(m_opticalCameras.size());
+}
+
+OpticalCamera* Database::getOpticalCamera(int i_index) const {
+  rebuildCache();
+  return (i_index >= 0 && size_t(i_index) < m_opticalCameras.size())
+             ? m_opticalCameras[size_t(i_index)]
+             : nullptr;
 }
 
 TSimpleArray<Module*> Database::getModulesWithName(const HString& i_rName,

@@ -5,6 +5,8 @@
 #include "plugin/host/HTimeManager.h"
 #include "plugin/host/Marker.h"
 #include "plugin/host/OperationStack.h"
+#include "plugin/host/OpticalCamera.h"
+#include "plugin/host/VideoCamera.h"
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
@@ -16,6 +18,8 @@ namespace AnvilCore {
 int dataTypeOf(const Module* i_pModule) {
   if (i_pModule->isKindOf(&Marker::s_classMarker)) return EDataMarkers;
   if (i_pModule->isKindOf(&Character::s_classCharacter)) return EDataSubjects;
+  if (i_pModule->isKindOf(&OpticalCamera::s_classOpticalCamera)) return EDataOpticalCameras;
+  if (i_pModule->isKindOf(&VideoCamera::s_classVideoCamera)) return EDataVideoCameras;
   if (i_pModule->isKindOf(&Node::s_classNode)) return EDataNodes;
   return 0;
 }

@@ -1,4 +1,6 @@
 #include "AnvilFileExportersPlugin.h"
+#include "exporters/camera/XCPExporter.h"
+#include "exporters/trajectory/CsmExporter.h"
 #include "exporters/trajectory/TrcExporter.h"
 
 AnvilFileExportersPlugin* AnvilFileExportersPlugin::createInstance() {
@@ -7,6 +9,8 @@ AnvilFileExportersPlugin* AnvilFileExportersPlugin::createInstance() {
 
 bool AnvilFileExportersPlugin::loadExporters() {
   // The host lists exporters in this order.
+  m_exporters.add(CsmExporter::createInstance());
   m_exporters.add(TrcExporter::createInstance());
+  m_exporters.add(XCPExporter::createInstance());
   return true;
 }

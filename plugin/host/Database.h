@@ -8,11 +8,13 @@
 #include <string>
 #include <vector>
 
+class CalibrationMgr;
 class Character;
 class FileExporterMgr;
 class HTimeManager;
 class Module;
 class Node;
+class OpticalCamera;
 class SubjectManager;
 struct HRuntimeClass;
 
@@ -30,6 +32,7 @@ public:
   FileExporterMgr* getFileExporterMgr();
   HTimeManager* getTimeManager();
   SubjectManager* getSubjectManager();
+  CalibrationMgr* getCalibrationMgr();
 
   HString getSceneName() const { return m_sceneName; }
   void setSceneName(const HString& i_rName) { m_sceneName = i_rName; }
@@ -62,6 +65,9 @@ public:
   /// Every node of the scene, parents before children.
   int getNumNodes() const;
   Node* getNode(int i_index) const;
+  /// Every optical camera of the scene, in scene order; null for an index out of range.
+  int getNumOpticalCameras() const;
+  OpticalCamera* getOpticalCamera(int i_index) const;
   /// Every module of the scene, parents before children.
   const std::vector<Module*>& getModules() const;
   TSimpleArray<Module*> getModulesWithName(const HString& i_rName,
@@ -84,6 +90,7 @@ private:
   std::unique_ptr<FileExporterMgr> m_pExporterMgr;
   std::unique_ptr<HTimeManager> m_pTimeManager;
   std::unique_ptr<SubjectManager> m_pSubjectManager;
+  std::unique_ptr<CalibrationMgr> m_pCalibrationMgr;
   HString m_sceneName;
   bool m_zUp = true;
   struct Rotation {
@@ -96,6 +103,7 @@ private:
   mutable bool m_cacheValid = false;
   mutable std::vector<Module*> m_modules;
   mutable std::vector<Node*> m_nodes;
+  mutable std::vector<OpticalCamera*> m_opticalCameras;
 };
 
 extern ANVIL_HOST_API Database* g_db;
