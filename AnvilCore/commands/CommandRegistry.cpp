@@ -24,7 +24,10 @@ bool CommandRegistry::add(Command* i_pCommand) {
 }
 
 int CommandRegistry::addFromPlugin(CommandPluginBase& i_rPlugin) {
-  if (!i_rPlugin.loadCommands()) return 0;
+  return i_rPlugin.loadCommands() ? addLoaded(i_rPlugin) : 0;
+}
+
+int CommandRegistry::addLoaded(const CommandPluginBase& i_rPlugin) {
   int added = 0;
   for (int i = 0; i < i_rPlugin.getNumCommands(); ++i)
     if (add(i_rPlugin.getCommand(i))) ++added;

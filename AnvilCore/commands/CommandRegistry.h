@@ -24,6 +24,8 @@ public:
   /// Loads a command plug-in (`loadCommands`) and adds each of its commands in its order.
   /// Returns the number added.
   int addFromPlugin(CommandPluginBase& i_rPlugin);
+  /// Adds the commands of a plug-in whose `loadCommands` has already run.
+  int addLoaded(const CommandPluginBase& i_rPlugin);
   /// The command of a script name (exact match), or null.
   Command* find(const std::string& i_rName) const;
   const std::vector<Command*>& commands() const { return m_commands; }

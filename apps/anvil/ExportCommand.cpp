@@ -1,5 +1,6 @@
 #include "AnvilCore/ExportDriver.h"
 #include "AnvilCore/io/SceneInputs.h"
+#include "CommandOptions.h"
 #include "ModuleLoader.h"
 #include "Subcommands.h"
 #include "plugin/host/Database.h"
@@ -71,6 +72,8 @@ int runExport(const CommonArgs& i_rCommon, const ExportArgs& i_rArgs) {
   }
   // Options persist from one run to the next; script commands change them after this.
   for (int i = 0; i < pMgr->getNumExporters(); ++i) pMgr->getExporterAt(i)->loadUserSetup();
+  if (const int code = runExportCommands(module, i_rArgs.scripts, i_rArgs.commandLines); code != EExitOk)
+    return code;
 
   if (!AnvilCore::loadSceneInputs(i_rArgs.inputs, error)) {
     printError(error);

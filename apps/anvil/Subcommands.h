@@ -19,6 +19,8 @@ struct ExportArgs {
   std::vector<std::string> outputs;
   std::string range; ///< "FIRST:LAST" in frames, or empty for the animation range
   bool selectedOnly = false;
+  std::vector<std::string> scripts;      ///< --script files of option commands
+  std::vector<std::string> commandLines; ///< -c option command lines
 };
 
 int runExport(const CommonArgs& i_rCommon, const ExportArgs& i_rArgs);

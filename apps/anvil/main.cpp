@@ -1,4 +1,5 @@
 // anvil: loads the export module, reads scenes and exports them.
+#include "CommandOptions.h"
 #include "Subcommands.h"
 #include <CLI/CLI.hpp>
 #include <iostream>
@@ -20,6 +21,11 @@ int main(int argc, char** argv) {
       ->required();
   pExport->add_option("--range", exportArgs.range, "Frames to export, FIRST:LAST");
   pExport->add_flag("--selected", exportArgs.selectedOnly, "Export only selected modules");
+  pExport->add_option("-c,--command", exportArgs.commandLines,
+                      "Option command line run before exporting, e.g. 'c3dExportOptions -real false'")
+      ->allow_extra_args(false);
+  pExport->add_option("--script", exportArgs.scripts, "File of option command lines")
+      ->allow_extra_args(false);
   pExport->add_option("--module", common.modulePath, "Path of libAnvilFileExport.so");
   pExport->add_option("--user-setup", common.userSetupPath, "User setup file");
 
@@ -31,6 +37,9 @@ int main(int argc, char** argv) {
   std::vector<std::string> infoInputs;
   CLI::App* pInfo = app.add_subcommand("info", "Summarise a scene");
   pInfo->add_option("inputs", infoInputs, "'demo' or scene files")->required();
+
+  CLI::App* pCommands = app.add_subcommand("commands", "List the option commands and their options");
+  pCommands->add_option("--module", common.modulePath, "Path of libAnvilFileExport.so");
 
   try {
     app.parse(argc, argv);
@@ -44,5 +53,6 @@ int main(int argc, char** argv) {
   if (pExport->parsed()) return runExport(common, exportArgs);
   if (pFormats->parsed()) return runFormats(common, extensionsOnly);
   if (pInfo->parsed()) return runInfo(common, infoInputs);
+  if (pCommands->parsed()) return runCommandsListing(common.modulePath);
   return EExitUsage;
 }
