@@ -42,7 +42,7 @@ Database::Database()
       m_pSubjectManager(std::make_unique<SubjectManager>()),
       m_pCalibrationMgr(std::make_unique<CalibrationMgr>()), m_logSink(defaultSink) {}
 
-Database::~Database() = default;
+Database::~Database() { clearClips(); }
 
 FileExporterMgr* Database::getFileExporterMgr() { return m_pExporterMgr.get(); }
 HTimeManager* Database::getTimeManager() { return m_pTimeManager.get(); }
@@ -101,6 +101,7 @@ void Database::removeFromScene(Module* i_pModule, bool, bool, bool) {
 
 void Database::clearScene() {
   m_pRoot = std::make_unique<Module>("Scene");
+  clearClips();
   m_rotations.clear();
   recomputeSceneMatrix();
   m_zUp = true;

@@ -1,4 +1,5 @@
 #include "ExportDriver.h"
+#include "plugin/host/AudioSource.h"
 #include "plugin/host/Character.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/FileExporter.h"
@@ -18,6 +19,7 @@ namespace AnvilCore {
 int dataTypeOf(const Module* i_pModule) {
   if (i_pModule->isKindOf(&Marker::s_classMarker)) return EDataMarkers;
   if (i_pModule->isKindOf(&Character::s_classCharacter)) return EDataSubjects;
+  if (i_pModule->isKindOf(&AudioSource::s_classAudioSource)) return EDataAudio;
   if (i_pModule->isKindOf(&OpticalCamera::s_classOpticalCamera)) return EDataOpticalCameras;
   if (i_pModule->isKindOf(&VideoCamera::s_classVideoCamera)) return EDataVideoCameras;
   if (i_pModule->isKindOf(&Node::s_classNode)) return EDataNodes;

@@ -1,5 +1,6 @@
 #include "AnvilFileExportersPlugin.h"
 #include "exporters/camera/XCPExporter.h"
+#include "exporters/trajectory/C3DExporter.h"
 #include "exporters/trajectory/CsmExporter.h"
 #include "exporters/trajectory/TrcExporter.h"
 
@@ -9,6 +10,7 @@ AnvilFileExportersPlugin* AnvilFileExportersPlugin::createInstance() {
 
 bool AnvilFileExportersPlugin::loadExporters() {
   // The host lists exporters in this order.
+  m_exporters.add(C3DExporter::createInstance());
   m_exporters.add(CsmExporter::createInstance());
   m_exporters.add(TrcExporter::createInstance());
   m_exporters.add(XCPExporter::createInstance());

@@ -13,6 +13,7 @@ class Character;
 class FileExporterMgr;
 class HTimeManager;
 class Module;
+class NLEClip;
 class Node;
 class OpticalCamera;
 class SubjectManager;
@@ -62,6 +63,18 @@ public:
   /// The invisible root; its children are the top-level modules.
   Module* getRoot() const { return m_pRoot.get(); }
 
+  /// The clip that playback and exports work on, or null.
+  NLEClip* getActiveClip() const { return m_pActiveClip; }
+  /// Makes a clip of the list active; null, or a clip not in the list, leaves none active. The
+  /// flags are the host's and ignored here.
+  void setActiveClip(const NLEClip* i_pClip, bool i_notify, bool i_undoable, bool i_update);
+  /// First clip of the list (follow `NLEClip::getNext`), or null.
+  NLEClip* getHeadClip() const { return m_pHeadClip; }
+  /// Host side: appends a clip to the list; the database owns it.
+  void addClip(NLEClip* i_pClip);
+  /// Host side: destroys every clip.
+  void clearClips();
+
   /// Every node of the scene, parents before children.
   int getNumNodes() const;
   Node* getNode(int i_index) const;
@@ -100,6 +113,8 @@ private:
   std::vector<Rotation> m_rotations;
   double m_sceneMatrix[9] = {1, 0, 0, 0, 1, 0, 0, 0, 1};
   LogSink m_logSink;
+  NLEClip* m_pHeadClip = nullptr;
+  NLEClip* m_pActiveClip = nullptr;
   mutable bool m_cacheValid = false;
   mutable std::vector<Module*> m_modules;
   mutable std::vector<Node*> m_nodes;

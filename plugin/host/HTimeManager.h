@@ -1,6 +1,18 @@
 #pragma once
 #include "HTime.h"
 #include "HostExport.h"
+#include "ITimecode.h"
+
+/// How the scene counts timecode (`HTimeManager::getTimecodeMode`).
+enum ETimecodeMode {
+  ETimecodeMode30Hz = 0,     ///< 30 fps, non-drop
+  ETimecodeModeNtsc = 1,     ///< 29.97 fps, non-drop
+  ETimecodeModeNtscDrop = 2, ///< 29.97 fps, drop frame
+  ETimecodeModePal = 3,      ///< 25 fps
+  ETimecodeModeFilm = 4,     ///< 24 fps
+  ETimecodeModeNtscFilm = 5, ///< 23.976 fps
+  ETimecodeModeNone = 6,     ///< no timecode
+};
 
 /// The scene clock: frame rate, ticks per frame, the animation and play ranges, current time.
 class ANVIL_HOST_API HTimeManager {
@@ -16,6 +28,15 @@ public:
   int64_t getTicksPerFrame() const { return m_ticksPerFrame; }
   int getTimecodeMode() const { return m_timecodeMode; }
   void setTimecodeMode(int i_mode) { m_timecodeMode = i_mode; }
+  /// True when the timecode mode names a standard (modes 0 to 5).
+  bool isTimecodeSupported() const;
+  /// Timecode of a time under the current mode, wrapped into one day. The subframe unit is the
+  /// largest tick count dividing both the scene's and the timecode's frame. Mode None (or an
+  /// unknown mode) gives a timecode whose standard is `ZMT::ETimecodeStandardCount` (invalid).
+  ZMT::ITimecode<135000000> getTimecode(HTime i_t) const;
+  /// The time whose timecode under the current mode is h:m:s:f (no subframes), counting from
+  /// midnight; -1 when the mode has no timecode or the fields are out of range.
+  HTime timecodeToTime(int i_hours, int i_minutes, int i_seconds, int i_frames) const;
 
   /// Frame number of a time: ticks divided by ticks per frame, rounded towards minus infinity.
   int getFrame(HTime i_t) const;
