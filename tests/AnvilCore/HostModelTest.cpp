@@ -1,0 +1,198 @@
+// The host's scene model: arrays, strings, rotations, transforms, the clock and scene rotation.
+#include "../support/HostFixture.h"
+#include "plugin/host/HString.h"
+#include "plugin/host/TSimpleArray.h"
+#include <cmath>
+#include <cstring>
+#include <gtest/gtest.h>
+
+using namespace HostTest;
+
+namespace {
+void expectNear(const Vec3& a, const Vec3& b, double tol = 1e-9) {
+  EXPECT_NEAR(a.x, b.x, tol);
+  EXPECT_NEAR(a.y, b.y, tol);
+  EXPECT_NEAR(a.z, b.z, tol);
+}
+} // namespace
+
+TEST(HostArrays, GrowByStepAndKeepElements) {
+  TSimpleArray<int> array(16);
+  for (int i = 0; i < 16; ++i) array.add(i * 3);
+  EXPECT_EQ(array.getCapacity(), 16);
+  array.add(99);
+  EXPECT_EQ(array.getCapacity(), 32);
+  EXPECT_EQ(array.getCount(), 17);
+  for (int i = 0; i < 16; ++i) EXPECT_EQ(array[i], i * 3);
+  EXPECT_EQ(array[16], 99);
+  array.removeAt(0);
+  EXPECT_EQ(array[0], 3);
+  EXPECT_EQ(array.find(99), 15);
+  array.setCount(0);
+  EXPECT_TRUE(array.isEmpty());
+
+  TArray<HString> strings(2);
+  for (int i = 0; i < 5; ++i) strings.add(HString(std::string(20, char('a' + i))));
+  TArray<HString> copy = strings;
+  EXPECT_EQ(copy.getCount(), 5);
+  EXPECT_EQ(copy[4], HString(std::string(20, 'e')));
+  EXPECT_EQ(HOutOfMemory().what(), std::string("E1224: Out of memory in TSimpleArray::addSpace"));
+}
+
+TEST(HostStrings, EditingOperations) {
+  HString s("Walker\\LFHD\\x");
+  EXPECT_EQ(s.Replace("\\", ":"), 2);
+  EXPECT_EQ(s, "Walker:LFHD:x");
+  EXPECT_EQ(s.ReverseFind(':'), 11);
+  EXPECT_EQ(s.Left(6), "Walker");
+  EXPECT_EQ(s.Right(1), "x");
+  EXPECT_EQ(s.Mid(7), "LFHD:x");
+  EXPECT_EQ(s.Mid(40), "");
+  EXPECT_EQ(HString("ScEnE").MakeLower(), "scene");
+  HString f;
+  f.Format("%s=%05.1f", "rate", 2.25);
+  EXPECT_EQ(f, "rate=002.2");
+  EXPECT_EQ(HString(nullptr), HString::EMPTY_STRING);
+}
+
+TEST(HostRotation, EulerRoundTripInEveryOrder) {
+  const Vec3 angles[] = {{10, 20, 30}, {-75, 40, 170}, {0, -89, 45}, {120, 5, -60}};
+  for (int order = 0; order < 6; ++order) {
+    for (const Vec3& in : angles) {
+      AnvilRotation r;
+      r.setAsEuler(AnvilRotation::RotOrder(order), in);
+      Vec3 out;
+      r.getAsEuler(AnvilRotation::RotOrder(order), out);
+      AnvilRotation back;
+      back.setAsEuler(AnvilRotation::RotOrder(order), out);
+      // The same rotation (angles may differ by equivalent sets near the limits).
+      const Vec3 v(0.3, -1.2, 2.5);
+      expectNear(r.rotate(v), back.rotate(v), 1e-9);
+      if (std::fabs(in.y) < 80) expectNear(in, out, 1e-9);
+    }
+  }
+}
+
+TEST(HostRotation, OrderMeansFirstAxisAppliedFirst) {
+  AnvilRotation r;
+  r.setAsEuler(AnvilRotation::XYZ, Vec3(90, 90, 0));
+  // X first takes +Y to +Z, then Y takes +Z to +X.
+  expectNear(r.rotate(Vec3(0, 1, 0)), Vec3(1, 0, 0));
+  r.setAsEuler(AnvilRotation::YXZ, Vec3(90, 90, 0));
+  // Y first leaves +Y alone, then X takes +Y to +Z.
+  expectNear(r.rotate(Vec3(0, 1, 0)), Vec3(0, 0, 1));
+  const AnvilRotation q(Vec3(1, 1, 0), 73.0);
+  expectNear((q * q.inverse()).rotate(Vec3(4, 5, 6)), Vec3(4, 5, 6));
+  double m[9];
+  q.getMatrix(m);
+  AnvilRotation fromMatrix;
+  fromMatrix.setMatrix(m);
+  expectNear(fromMatrix.rotate(Vec3(1, 2, 3)), q.rotate(Vec3(1, 2, 3)));
+}
+
+TEST(HostTransforms, ComposeThroughParents) {
+  resetScene(100.0, 3);
+  auto* pParent = new Node("Parent");
+  pParent->setPreTranslation(Vec3(0, 0, 100));
+  pParent->setStaticTransform(Vec3(10, 0, 0), AnvilRotation(Vec3(0, 0, 1), 90), Vec3(1, 1, 1));
+  g_db->addToScene(pParent, false, nullptr, false, false);
+  auto* pChild = new Node("Child");
+  pChild->setPreRotation(AnvilRotation(Vec3(1, 0, 0), 90));
+  pChild->setStaticTransform(Vec3(5, 0, 0), AnvilRotation(), Vec3(2, 2, 2));
+  g_db->addChild(pParent, pChild);
+  auto* pGrandChild = new Node("GrandChild");
+  pGrandChild->setStaticTransform(Vec3(0, 1, 0), AnvilRotation(), Vec3(1, 1, 1));
+  g_db->addChild(pChild, pGrandChild);
+
+  // Child origin: parent maps (5,0,0) by Rz(90) to (0,5,0), plus (10,0,100).
+  expectNear(pChild->getWSPos(0), Vec3(10, 5, 100));
+  // Grandchild: (0,1,0) scaled by 2, rotated by Rx(90) to (0,0,2), then Rz(90) leaves it.
+  expectNear(pGrandChild->getWSPos(0), Vec3(10, 5, 102));
+  expectNear(pGrandChild->getConstWSPos(), Vec3(10, 5, 102));
+  EXPECT_EQ(pGrandChild->getPartialPathString(), "Parent\\Child\\GrandChild");
+  EXPECT_EQ(pGrandChild->getFullPathString(), "\\Parent\\Child\\GrandChild");
+  EXPECT_TRUE(pGrandChild->isDescendedFrom(pParent));
+  EXPECT_EQ(g_db->getNumNodes(), 3);
+}
+
+TEST(HostTransforms, TracksInterpolateAndHoldEnds) {
+  resetScene(100.0, 10);
+  const int64_t tpf = g_db->getTimeManager()->getTicksPerFrame();
+  auto* pNode = new Node("N");
+  pNode->m_positionTrack.setKey(2 * tpf, Vec3(0, 0, 0));
+  pNode->m_positionTrack.setKey(4 * tpf, Vec3(10, -20, 4));
+  pNode->m_rotationTrack.setKey(2 * tpf, AnvilRotation());
+  pNode->m_rotationTrack.setKey(4 * tpf, AnvilRotation(Vec3(0, 0, 1), 90));
+  g_db->addToScene(pNode, false, nullptr, false, false);
+  expectNear(pNode->getLocalPos(3 * tpf), Vec3(5, -10, 2));
+  expectNear(pNode->getLocalPos(0), Vec3(0, 0, 0));
+  expectNear(pNode->getLocalPos(9 * tpf), Vec3(10, -20, 4));
+  expectNear(pNode->getWSRot(3 * tpf).rotate(Vec3(1, 0, 0)),
+             Vec3(std::cos(M_PI / 4), std::sin(M_PI / 4), 0));
+
+  Marker* pMarker = addMarker("M", {Vec3(0, 0, 0), std::nullopt, Vec3(2, 4, 6)});
+  int index = -1;
+  EXPECT_FALSE(pMarker->m_track.hasKeyAt(tpf, index));
+  EXPECT_TRUE(pMarker->m_track.hasKeyAt(2 * tpf, index));
+  EXPECT_EQ(index, 1);
+  expectNear(pMarker->getWSPos(tpf), Vec3(1, 2, 3));
+  int first = -1;
+  EXPECT_EQ(pMarker->m_track.getKeysInRange(HTimeRange(tpf, 5 * tpf), first), 1);
+  EXPECT_EQ(first, 1);
+}
+
+TEST(HostSceneRotation, QuarterTurnsAreExactAndUndoRestoresBits) {
+  resetScene(100.0, 2);
+  Character* pSubject = addSubject("S");
+  Marker* pMarker = addMarker("M", {Vec3(1.1, -2.3, 3.7), Vec3(-0.0, 1e-300, 5e10)}, pSubject);
+  auto* pNode = new Node("N");
+  pNode->setStaticTransform(Vec3(0.1, 0.2, 0.3), AnvilRotation(Vec3(1, 2, 3), 33), Vec3(1, 1, 1));
+  g_db->addToScene(pNode, false, nullptr, false, false);
+  const int64_t tpf = g_db->getTimeManager()->getTicksPerFrame();
+
+  const Vec3 before0 = pMarker->getWSPos(0), before1 = pMarker->getWSPos(tpf);
+  const Vec3 nodeBefore = pNode->getWSPos(0);
+  double qBefore[4], qAfter[4];
+  pNode->getWSRot(0).getAsQuaternion(qBefore[0], qBefore[1], qBefore[2], qBefore[3]);
+
+  g_db->rotateScene(90.0, 0); // Y up to Z up
+  const Vec3 rotated = pMarker->getWSPos(0);
+  EXPECT_EQ(rotated, Vec3(1.1, -3.7, -2.3));
+  g_db->rotateScene(-90.0, 0);
+  const Vec3 after0 = pMarker->getWSPos(0), after1 = pMarker->getWSPos(tpf);
+  EXPECT_EQ(std::memcmp(&before0, &after0, sizeof(Vec3)), 0);
+  EXPECT_EQ(std::memcmp(&before1, &after1, sizeof(Vec3)), 0);
+  const Vec3 nodeAfter = pNode->getWSPos(0);
+  EXPECT_EQ(std::memcmp(&nodeBefore, &nodeAfter, sizeof(Vec3)), 0);
+  pNode->getWSRot(0).getAsQuaternion(qAfter[0], qAfter[1], qAfter[2], qAfter[3]);
+  EXPECT_EQ(std::memcmp(qBefore, qAfter, sizeof qBefore), 0);
+  EXPECT_FALSE(g_db->isSceneRotated());
+
+  // Any angle, undone in reverse order, restores the scene too.
+  g_db->rotateScene(30.0, 2);
+  g_db->rotateScene(-90.0, 1);
+  expectNear(pMarker->getWSPos(0),
+             AnvilRotation(Vec3(0, 1, 0), -90).rotate(AnvilRotation(Vec3(0, 0, 1), 30).rotate(before0)));
+  g_db->rotateScene(90.0, 1);
+  g_db->rotateScene(-30.0, 2);
+  EXPECT_EQ(pMarker->getWSPos(0), before0);
+}
+
+TEST(HostClock, TicksFramesAndRanges) {
+  HTimeManager* pTime = g_db->getTimeManager();
+  pTime->setFrameRate(120.0);
+  EXPECT_EQ(pTime->getTicksPerFrame(), 1125000);
+  EXPECT_EQ(pTime->getFrame(1125000 * 5 + 3), 5);
+  EXPECT_EQ(pTime->getFrame(-1), -1);
+  EXPECT_EQ(HTimeRange(0, 1125000 * 9).getNumFrames(), 10);
+  EXPECT_EQ(HTimeRange(1125000 * 9, 0).getNumFrames(), -8);
+  pTime->setFrameRate(30000.0 / 1001.0);
+  EXPECT_EQ(pTime->getTicksPerFrame(), 4504500);
+  const HTime t = (3600 + 2 * 60 + 7) * kTicksPerSecond + 5;
+  EXPECT_EQ(pTime->getHours(t), 1);
+  EXPECT_EQ(pTime->getMinutes(t), 2);
+  EXPECT_EQ(pTime->getSeconds(t), 7);
+  pTime->setFrameRate(-5.0); // refused: the rate stays
+  EXPECT_EQ(pTime->getTicksPerFrame(), 4504500);
+  pTime->setFrameRate(120.0);
+}

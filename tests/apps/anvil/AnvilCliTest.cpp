@@ -1,0 +1,122 @@
+// The built program end to end: exit codes, messages, and files written or not.
+#include <array>
+#include <cstdio>
+#include <filesystem>
+#include <fstream>
+#include <gtest/gtest.h>
+#include <sstream>
+#include <string>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace fs = std::filesystem;
+
+namespace {
+struct Run {
+  int code;
+  std::string output; // stdout and stderr together
+};
+
+class AnvilCli : public ::testing::Test {
+protected:
+  void SetUp() override {
+    m_dir = fs::temp_directory_path() /
+            ("anvil-cli-test-" + std::to_string(::getpid()) + "-" +
+             ::testing::UnitTest::GetInstance()->current_test_info()->name());
+    fs::remove_all(m_dir);
+    fs::create_directories(m_dir);
+  }
+  void TearDown() override { fs::remove_all(m_dir); }
+
+  Run anvil(const std::string& i_args) {
+    const std::string command = std::string(ANVIL_BIN_DIR) + "/anvil --user-setup '" +
+                                (m_dir / "setup.ini").string() + "' " + i_args + " 2>&1";
+    Run run{-1, {}};
+    FILE* pPipe = ::popen(command.c_str(), "r");
+    if (!pPipe) return run;
+    std::array<char, 4096> buffer;
+    for (size_t n; (n = std::fread(buffer.data(), 1, buffer.size(), pPipe)) > 0;)
+      run.output.append(buffer.data(), n);
+    const int status = ::pclose(pPipe);
+    run.code = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+    return run;
+  }
+  std::string path(const std::string& i_name) const { return (m_dir / i_name).string(); }
+  fs::path m_dir;
+};
+
+std::string line(const std::string& i_path, int i_index) {
+  std::ifstream in(i_path);
+  std::string text;
+  for (int i = 0; i <= i_index && std::getline(in, text); ++i) {
+  }
+  return text;
+}
+} // namespace
+
+TEST_F(AnvilCli, ExportsTheDemoToTrc) {
+  const Run run = anvil("export demo -o " + path("demo.trc"));
+  ASSERT_EQ(run.code, 0) << run.output;
+  EXPECT_EQ(line(path("demo.trc"), 0), "PathFileType\t4\t(X/Y/Z)\t" + path("demo.trc"));
+  EXPECT_EQ(line(path("demo.trc"), 2), "120.000000\t120.000000\t1200\t44\tmm\t120.000000\t1\t1200");
+  EXPECT_EQ(line(path("demo.trc"), 5).rfind("0\t0.000000\t", 0), 0u);
+  // The options were stored for the next run.
+  EXPECT_TRUE(fs::exists(path("setup.ini")));
+
+  const Run ranged = anvil("export demo --range 10:19 -o " + path("part.trc"));
+  ASSERT_EQ(ranged.code, 0) << ranged.output;
+  EXPECT_EQ(line(path("part.trc"), 2), "120.000000\t120.000000\t10\t44\tmm\t120.000000\t1\t10");
+  EXPECT_EQ(line(path("part.trc"), 5).rfind("10\t0.083333\t", 0), 0u);
+}
+
+TEST_F(AnvilCli, UsageErrorsExitTwoAndWriteNothing) {
+  Run run = anvil("export demo -o " + path("demo.xyz"));
+  EXPECT_EQ(run.code, 2);
+  EXPECT_NE(run.output.find("no exporter for this extension (known: "), std::string::npos) << run.output;
+  EXPECT_NE(run.output.find(".trc"), std::string::npos);
+
+  std::ofstream(path("bad.json")) << R"({"time": {"frameRate": "fast"}})";
+  run = anvil("export " + path("bad.json") + " -o " + path("out.trc"));
+  EXPECT_EQ(run.code, 2);
+  EXPECT_NE(run.output.find("at /time/frameRate: expected a number"), std::string::npos) << run.output;
+  EXPECT_FALSE(fs::exists(path("out.trc")));
+
+  run = anvil("export demo --range 9:3 -o " + path("out.trc"));
+  EXPECT_EQ(run.code, 2);
+  EXPECT_FALSE(fs::exists(path("out.trc")));
+
+  run = anvil("export demo");
+  EXPECT_EQ(run.code, 2) << run.output;
+  run = anvil("export " + path("missing.json") + " -o " + path("out.trc"));
+  EXPECT_EQ(run.code, 2);
+  EXPECT_NE(run.output.find("missing.json: no such file"), std::string::npos) << run.output;
+
+  run = anvil(std::string("--module ") + ANVIL_WRONG_API_MODULE + " formats");
+  EXPECT_EQ(run.code, 2);
+  EXPECT_NE(run.output.find("API version 0x70000 is not supported"), std::string::npos) << run.output;
+}
+
+TEST_F(AnvilCli, UnwritableOutputFailsWithOneMessage) {
+  const Run run = anvil("export demo -o " + path("no/such/folder/x.trc"));
+  EXPECT_EQ(run.code, 1);
+  EXPECT_NE(run.output.find("cannot create"), std::string::npos) << run.output;
+  EXPECT_NE(run.output.find("nothing written"), std::string::npos);
+}
+
+TEST_F(AnvilCli, InfoFormatsAndHelp) {
+  Run run = anvil("info demo");
+  ASSERT_EQ(run.code, 0) << run.output;
+  EXPECT_NE(run.output.find("frame rate: 120 Hz"), std::string::npos) << run.output;
+  EXPECT_NE(run.output.find("labelled markers: 41"), std::string::npos);
+  EXPECT_NE(run.output.find("unlabelled markers: 3"), std::string::npos);
+  EXPECT_NE(run.output.find("subjects: 1"), std::string::npos);
+
+  run = anvil("formats");
+  ASSERT_EQ(run.code, 0) << run.output;
+  EXPECT_NE(run.output.find("Motion Analysis Trajectory"), std::string::npos);
+  for (const char* sub : {"export --help", "formats --help", "info --help", "--help"}) {
+    run = anvil(sub);
+    EXPECT_EQ(run.code, 0) << sub;
+    EXPECT_NE(run.output.find("Usage"), std::string::npos) << sub;
+  }
+}

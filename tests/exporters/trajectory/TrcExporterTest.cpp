@@ -1,0 +1,154 @@
+// TRC text, byte for byte: header lines, names, column numbering, gaps and ranges.
+#include "../../support/HostFixture.h"
+#include "../RunExport.h"
+#include "exporters/trajectory/TrcExporter.h"
+#include "plugin/host/HInterface.h"
+#include "plugin/host/OperationStack.h"
+#include <gtest/gtest.h>
+#include <memory>
+#include <sstream>
+
+using namespace HostTest;
+
+namespace {
+struct TrcDeleter {
+  void operator()(TrcExporter* p) const { p->deleteThis(); }
+};
+using TrcPtr = std::unique_ptr<TrcExporter, TrcDeleter>;
+
+std::vector<std::string> lines(const std::string& i_rText) {
+  std::vector<std::string> result;
+  std::istringstream in(i_rText);
+  for (std::string line; std::getline(in, line);) result.push_back(line);
+  return result;
+}
+
+class TrcExport : public ::testing::Test {
+protected:
+  void SetUp() override {
+    resetScene(100.0, 3);
+    m_pExporter.reset(TrcExporter::createInstance());
+    m_path = ExportTest::tempPath("take.trc");
+  }
+  std::string run() { return ExportTest::exportText(*m_pExporter, m_path); }
+  TrcPtr m_pExporter;
+  std::string m_path;
+};
+} // namespace
+
+TEST_F(TrcExport, WholeFileForTwoMarkersWithAGap) {
+  Character* pBob = addSubject("Bob");
+  addMarker("LFHD", {Vec3(1, 2, 3), std::nullopt, Vec3(7.5, -8.25, 9)}, pBob);
+  addMarker("_stray", {Vec3(0, 0, 0), Vec3(0.1, 0.2, 0.3), Vec3(-1, -2, -3)});
+  const std::string expected =
+      "PathFileType\t4\t(X/Y/Z)\t" + m_path + "\n"
+      "DataRate\tCameraRate\tNumFrames\tNumMarkers\tUnits\tOrigDataRate\tOrigDataStartFrame\tOrigNumFrames\n"
+      "100.000000\t100.000000\t3\t2\tmm\t100.000000\t1\t3\n"
+      "Frame#\tTime\tLFHD\t\t\t_stray\t\t\t\n"
+      "\t\tX0\tY0\tZ0\tX1\tY1\tZ1\t\n"
+      "0\t0.000000\t1.000000\t2.000000\t3.000000\t0.000000\t0.000000\t0.000000\n"
+      "1\t0.010000\t\t\t\t0.100000\t0.200000\t0.300000\n"
+      "2\t0.020000\t7.500000\t-8.250000\t9.000000\t-1.000000\t-2.000000\t-3.000000\n";
+  EXPECT_EQ(run(), expected);
+}
+
+TEST_F(TrcExport, NamesUnderEachFlagCombination) {
+  Character* pBob = addSubject("_Bob");
+  Marker* pInSubject = addMarker("_LFHD", {Vec3()}, pBob);
+  Marker* pLoose = addMarker("_loose", {Vec3()});
+  Character* pAl = addSubject("Al");
+  Marker* pAlMarker = addMarker("_RFHD", {Vec3()}, pAl);
+  TrcExporter& e = *m_pExporter;
+
+  EXPECT_EQ(e.displayName(pInSubject), "_LFHD"); // no subject names: bare, no stripping
+  e.setRemoveLeadingUnderscores(true);
+  EXPECT_EQ(e.displayName(pInSubject), "_LFHD");
+  e.setWriteSubjects(true);
+  EXPECT_EQ(e.displayName(pInSubject), "Bob:_LFHD"); // path form, one "_" removed
+  EXPECT_EQ(e.displayName(pLoose), "_loose");        // no character parent: bare
+  e.setCollapseSubjects(true);
+  EXPECT_EQ(e.displayName(pInSubject), "Bob__LFHD");
+  EXPECT_EQ(e.displayName(pAlMarker), "Al__RFHD"); // only the whole name's first character counts
+  e.setRemoveLeadingUnderscores(false);
+  EXPECT_EQ(e.displayName(pInSubject), "_Bob__LFHD");
+  e.setCollapseSubjects(false);
+  EXPECT_EQ(e.displayName(pAlMarker), "Al:_RFHD");
+}
+
+TEST_F(TrcExport, NoMarkersAndBackwardRange) {
+  g_db->addToScene(new Node("notAMarker"), false, nullptr, false, false);
+  std::vector<std::string> text = lines(run());
+  ASSERT_EQ(text.size(), 8u);
+  EXPECT_EQ(text[3], "Frame#\tTime\t");
+  EXPECT_EQ(text[4], "\t\t");
+  EXPECT_EQ(text[7], "2\t0.020000");
+
+  // A range whose end lies before its start prints the range's frame count and no frame line.
+  AnvilCore::ExportRequest request;
+  request.path = m_path;
+  const int64_t tpf = g_db->getTimeManager()->getTicksPerFrame();
+  request.range = HTimeRange(5 * tpf, 2 * tpf);
+  std::string error;
+  ASSERT_EQ(AnvilCore::runExport(*m_pExporter, request, error), AnvilCore::EExportStatus::EOk);
+  text = lines(ExportTest::readText(m_path));
+  ASSERT_EQ(text.size(), 5u);
+  EXPECT_EQ(text[2], "100.000000\t100.000000\t-2\t0\tmm\t100.000000\t1\t-2");
+}
+
+TEST_F(TrcExport, TimeColumnIsAbsoluteAndReset) {
+  resetScene(100.0, 40);
+  addMarker("m", Positions(40, Vec3(1, 1, 1)));
+  AnvilCore::ExportRequest request;
+  request.path = m_path;
+  const int64_t tpf = g_db->getTimeManager()->getTicksPerFrame();
+  request.range = HTimeRange(30 * tpf, 31 * tpf);
+  std::string error;
+  ASSERT_EQ(AnvilCore::runExport(*m_pExporter, request, error), AnvilCore::EExportStatus::EOk);
+  // A second export through the same object must not repeat the first one's markers.
+  ASSERT_EQ(AnvilCore::runExport(*m_pExporter, request, error), AnvilCore::EExportStatus::EOk);
+  const std::vector<std::string> text = lines(ExportTest::readText(m_path));
+  ASSERT_EQ(text.size(), 7u);
+  EXPECT_EQ(text[4], "\t\tX0\tY0\tZ0\t");
+  EXPECT_EQ(text[5], "30\t0.300000\t1.000000\t1.000000\t1.000000");
+}
+
+TEST_F(TrcExport, ProgressStepsEveryTenthFrameFromZero) {
+  resetScene(100.0, 25);
+  addMarker("m", Positions(25, Vec3()));
+  g_theOperationStack.setStream(nullptr, false);
+  run();
+  EXPECT_EQ(g_theOperationStack.getLow(), 0);
+  EXPECT_EQ(g_theOperationStack.getHigh(), 2);
+  EXPECT_EQ(g_theOperationStack.getSteps(), 3); // frames 0, 10 and 20
+}
+
+TEST_F(TrcExport, UserSetupKeysAndTheUnlabelledDefault) {
+  TrcExporter& e = *m_pExporter;
+  HInterface store;
+  const HString& scope = HString::EMPTY_STRING;
+  std::string error;
+  ASSERT_TRUE(store.load(ExportTest::tempPath("none.ini"), error));
+  g_interface = store;
+  // An empty store turns write-unlabelled off, since it defaults to the write-subjects flag.
+  e.loadUserSetup();
+  EXPECT_FALSE(e.getWriteUnlabelled());
+  e.setWriteSubjects(true);
+  e.setCollapseSubjects(true);
+  e.saveUserSetup();
+  EXPECT_EQ(*g_interface.find("TRCExporter", "ExportSubjectNames"), "1");
+  EXPECT_EQ(*g_interface.find("TRCExporter", "WriteUnlabelled"), "0");
+  g_interface.clear();
+  g_interface.setUserSetupInt("TRCExporter", "ExportSubjectNames", 0, scope);
+  e.loadUserSetup(); // WriteUnlabelled absent: default is write subjects, still true here
+  EXPECT_TRUE(e.getWriteUnlabelled());
+  EXPECT_FALSE(e.getWriteSubjects());
+  EXPECT_TRUE(e.getCollapseSubjects());
+
+  TrcExportOptions options;
+  ASSERT_TRUE(e.getOptions(&options));
+  EXPECT_TRUE(options.m_collapseSubjects);
+  options.m_removeLeadingUnderscores = true;
+  ASSERT_TRUE(e.setOptions(&options));
+  EXPECT_TRUE(e.getRemoveLeadingUnderscores());
+  g_interface.clear();
+}
