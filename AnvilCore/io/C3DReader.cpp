@@ -1,0 +1,463 @@
+#include "C3DReader.h"
+#include <algorithm>
+#include <cmath>
+#include <cstdio>
+#include <limits>
+
+namespace AnvilCore {
+
+namespace {
+// The largest parameter record payload accepted: a record never spans more than 64k of data in
+// files written by anyone, and the cap keeps absurd dimensions from allocating.
+constexpr size_t kMaxParameterBytes = 16u << 20;
+
+struct C3DError {
+  std::string message;
+};
+
+std::string atByte(const std::string& i_message, size_t i_offset) {
+  return i_message + " (byte " + std::to_string(i_offset) + ")";
+}
+
+[[noreturn]] void fail(const std::string& i_message, size_t i_offset) {
+  throw C3DError{atByte(i_message, i_offset)};
+}
+
+std::string trimRight(std::string i_text) {
+  while (!i_text.empty() && (i_text.back() == ' ' || i_text.back() == '\0'))
+    i_text.pop_back();
+  return i_text;
+}
+
+std::string trim(std::string i_text) {
+  i_text = trimRight(std::move(i_text));
+  const size_t start = i_text.find_first_not_of(' ');
+  return start == std::string::npos ? std::string() : i_text.substr(start);
+}
+
+std::string upper(std::string i_text) {
+  for (char& c : i_text)
+    if (c >= 'a' && c <= 'z') c = char(c - 'a' + 'A');
+  return i_text;
+}
+} // namespace
+
+size_t C3DParameter::count() const {
+  size_t n = 1;
+  for (int d : dims)
+    n *= size_t(d);
+  return n;
+}
+
+long C3DParameter::intValue(size_t i) const {
+  if (i >= count()) return 0;
+  switch (type) {
+  case C3D::ETypeChar:
+  case C3D::ETypeByte:
+    return data[i];
+  case C3D::ETypeInt16:
+    return int16_t(C3D::getU16(&data[i * 2], processor));
+  case C3D::ETypeFloat: {
+    const float value = C3D::getFloat(&data[i * 4], processor);
+    return std::isfinite(value) && std::fabs(value) < 2e9f ? long(value) : 0;
+  }
+  default:
+    return 0;
+  }
+}
+
+long C3DParameter::unsignedValue(size_t i) const {
+  if (type == C3D::ETypeInt16 && i < count()) return C3D::getU16(&data[i * 2], processor);
+  return intValue(i);
+}
+
+float C3DParameter::floatValue(size_t i) const {
+  if (type == C3D::ETypeFloat && i < count()) return C3D::getFloat(&data[i * 4], processor);
+  return float(intValue(i));
+}
+
+std::vector<std::string> C3DParameter::strings() const {
+  std::vector<std::string> result;
+  if (type != C3D::ETypeChar) return result;
+  if (dims.empty()) {
+    result.push_back(trimRight(std::string(data.begin(), data.end())));
+    return result;
+  }
+  const size_t width = size_t(dims[0]);
+  const size_t rows = width ? count() / width : 0;
+  for (size_t r = 0; r < rows; ++r)
+    result.push_back(trimRight(
+        std::string(data.begin() + long(r * width), data.begin() + long((r + 1) * width))));
+  return result;
+}
+
+const C3DParameter* C3DContent::find(const std::string& i_group, const std::string& i_name) const {
+  const auto it = m_index.find(i_group + ":" + i_name);
+  return it == m_index.end() ? nullptr : &parameters[it->second];
+}
+
+/// Reads the three sections of a file in order: header, parameters, frames.
+class C3DParser {
+public:
+  C3DParser(const uint8_t* i_pData, size_t i_size, C3DContent& o_rContent)
+      : m_pData(i_pData), m_size(i_size), m_rOut(o_rContent) {}
+
+  void parse() {
+    readHeaderStart();
+    readParameters();
+    readLayout();
+    readPoints();
+    readAnalog();
+  }
+
+private:
+  void need(size_t i_offset, size_t i_count, const char* i_pWhat) const {
+    if (i_offset > m_size || i_count > m_size - i_offset)
+      fail(std::string("file ends inside ") + i_pWhat + ": " + std::to_string(i_count) +
+               " bytes needed, " + std::to_string(i_offset < m_size ? m_size - i_offset : 0) +
+               " left",
+           i_offset);
+  }
+  uint16_t word(size_t i_offset) const { return C3D::getU16(m_pData + i_offset, m_rOut.processor); }
+  float real(size_t i_offset) const { return C3D::getFloat(m_pData + i_offset, m_rOut.processor); }
+
+  void readHeaderStart() {
+    need(0, C3D::kBlockSize, "the 512-byte header");
+    if (m_pData[C3D::HeaderOffset::EKey] != C3D::kFormatKey) {
+      char text[96];
+      std::snprintf(text, sizeof text, "not a C3D file: header byte 1 is 0x%02X, not 0x50",
+                    m_pData[C3D::HeaderOffset::EKey]);
+      fail(text, 1);
+    }
+    const int block = m_pData[C3D::HeaderOffset::EParameterBlock];
+    if (block < 2) fail("header names parameter block " + std::to_string(block), 0);
+    m_parameterStart = size_t(block - 1) * C3D::kBlockSize;
+    need(m_parameterStart, 4, "the parameter section's first 4 bytes");
+    const int processor = m_pData[m_parameterStart + 3];
+    if (processor != C3D::EProcessorIntel && processor != C3D::EProcessorDec &&
+        processor != C3D::EProcessorMips)
+      fail("unknown processor type " + std::to_string(processor) +
+               " (84 Intel, 85 DEC and 86 MIPS are known)",
+           m_parameterStart + 3);
+    m_rOut.processor = C3D::EProcessor(processor);
+    m_dataBlock = word(C3D::HeaderOffset::EDataStart);
+  }
+
+  void readParameters() {
+    // The section ends where the frames begin (its block count is not trusted: some writers
+    // give a constant).
+    size_t end = m_size;
+    const size_t dataStart = m_dataBlock > 0 ? size_t(m_dataBlock - 1) * C3D::kBlockSize : 0;
+    if (dataStart > m_parameterStart && dataStart < end) end = dataStart;
+    std::map<int, std::string> groups;
+    size_t pos = m_parameterStart + 4;
+    while (pos + 2 <= end) {
+      const int nameLength = std::abs(int(int8_t(m_pData[pos])));
+      const int id = int8_t(m_pData[pos + 1]);
+      if (nameLength == 0 || id == 0) break;
+      const size_t record = pos;
+      const size_t offsetAt = pos + 2 + size_t(nameLength);
+      if (offsetAt + 2 > end) fail("parameter record runs past the parameter section", record);
+      std::string name = upper(std::string(m_pData + pos + 2, m_pData + offsetAt));
+      const uint16_t next = word(offsetAt);
+      size_t cursor = offsetAt + 2;
+      if (id < 0) {
+        groups.emplace(-id, name);
+      } else {
+        C3DParameter parameter;
+        parameter.name = std::move(name);
+        parameter.offset = record;
+        parameter.processor = m_rOut.processor;
+        readParameterBody(parameter, id, cursor, end);
+        m_groupIds.push_back(id);
+        m_rOut.parameters.push_back(std::move(parameter));
+      }
+      if (next == 0) break;
+      pos = offsetAt + next;
+    }
+    for (size_t i = 0; i < m_rOut.parameters.size(); ++i) {
+      C3DParameter& parameter = m_rOut.parameters[i];
+      const auto group = groups.find(m_groupIds[i]);
+      if (group != groups.end()) parameter.group = group->second;
+      m_rOut.m_index.emplace(parameter.group + ":" + parameter.name, i);
+    }
+  }
+
+  void readParameterBody(C3DParameter& io_rParameter, int i_group, size_t i_cursor, size_t i_end) {
+    const std::string what = "parameter " + io_rParameter.name;
+    if (i_cursor + 2 > i_end) fail(what + " runs past the parameter section", io_rParameter.offset);
+    io_rParameter.type = int8_t(m_pData[i_cursor]);
+    const int dimCount = m_pData[i_cursor + 1];
+    if (io_rParameter.type != C3D::ETypeChar && io_rParameter.type != C3D::ETypeByte &&
+        io_rParameter.type != C3D::ETypeInt16 && io_rParameter.type != C3D::ETypeFloat)
+      fail(what + " has data type " + std::to_string(io_rParameter.type) + " (known: -1, 1, 2, 4)",
+           i_cursor);
+    i_cursor += 2;
+    if (i_cursor + size_t(dimCount) > i_end)
+      fail(what + " runs past the parameter section", io_rParameter.offset);
+    size_t bytes = size_t(std::abs(io_rParameter.type));
+    for (int d = 0; d < dimCount; ++d) {
+      io_rParameter.dims.push_back(m_pData[i_cursor + size_t(d)]);
+      bytes *= m_pData[i_cursor + size_t(d)];
+      if (bytes > kMaxParameterBytes) fail(what + " declares absurd dimensions", i_cursor);
+    }
+    i_cursor += size_t(dimCount);
+    if (i_cursor + bytes > i_end)
+      fail(what + " holds " + std::to_string(bytes) + " bytes of data past the parameter section",
+           io_rParameter.offset);
+    io_rParameter.data.assign(m_pData + i_cursor, m_pData + i_cursor + bytes);
+    (void)i_group;
+  }
+
+  // Counts, rates and frame range from the header and the parameters.
+  void readLayout() {
+    const size_t headerPoints = word(C3D::HeaderOffset::EPointCount);
+    m_rOut.pointCount = int(headerPoints);
+    if (const C3DParameter* p = m_rOut.find("POINT", "USED")) {
+      if (p->unsignedValue(0) != long(headerPoints))
+        fail("POINT:USED is " + std::to_string(p->unsignedValue(0)) + " but the header counts " +
+                 std::to_string(headerPoints) + " points",
+             p->offset);
+    }
+    readFrameRange();
+    readScaleAndRate();
+    readLabels();
+    readAnalogLayout();
+  }
+
+  void readFrameRange() {
+    long first = word(C3D::HeaderOffset::EFirstFrame);
+    long last = word(C3D::HeaderOffset::ELastFrame);
+    const C3DParameter* pStart = m_rOut.find("TRIAL", "ACTUAL_START_FIELD");
+    const C3DParameter* pEnd = m_rOut.find("TRIAL", "ACTUAL_END_FIELD");
+    const C3DParameter* pDruFirst = m_rOut.find("POINT", "DRU_FIRST_FRAME");
+    const C3DParameter* pDruLast = m_rOut.find("POINT", "DRU_LAST_FRAME");
+    if (pStart && pEnd && pStart->count() >= 2 && pEnd->count() >= 2) {
+      first = pStart->unsignedValue(0) | (pStart->unsignedValue(1) << 16);
+      last = pEnd->unsignedValue(0) | (pEnd->unsignedValue(1) << 16);
+    } else if (pDruFirst || pDruLast) {
+      // This family's writer keeps frame numbers above 65534 here as 32-bit integers.
+      auto int32 = [](const C3DParameter* i_p, long i_default) {
+        if (!i_p || i_p->data.size() != 4) return i_default;
+        const uint8_t* b = i_p->data.data();
+        return long(int32_t(uint32_t(b[0]) | uint32_t(b[1]) << 8 | uint32_t(b[2]) << 16 |
+                            uint32_t(b[3]) << 24));
+      };
+      first = int32(pDruFirst, first);
+      last = int32(pDruLast, last);
+    } else if (const C3DParameter* pFrames = m_rOut.find("POINT", "FRAMES")) {
+      // A long file keeps the true count here while the header's last frame saturates.
+      const long frames =
+          pFrames->type == C3D::ETypeFloat ? pFrames->intValue(0) : pFrames->unsignedValue(0);
+      if (frames > last - first + 1) last = first + frames - 1;
+    }
+    if (last < first - 1 || first < 0 || last > std::numeric_limits<int>::max() - 1)
+      fail("frame range " + std::to_string(first) + " to " + std::to_string(last) +
+               " is not a valid range",
+           C3D::HeaderOffset::EFirstFrame);
+    m_rOut.firstFrame = int(first);
+    m_rOut.frameCount = int(last - first + 1);
+  }
+
+  void readScaleAndRate() {
+    m_rOut.scale = real(C3D::HeaderOffset::EScale);
+    size_t scaleAt = C3D::HeaderOffset::EScale;
+    if (const C3DParameter* p = m_rOut.find("POINT", "SCALE")) {
+      m_rOut.scale = p->floatValue(0);
+      scaleAt = p->offset;
+    }
+    if (!std::isfinite(m_rOut.scale) || m_rOut.scale == 0.0f)
+      fail("the point scale is " + std::to_string(m_rOut.scale), scaleAt);
+    double rate = real(C3D::HeaderOffset::EFrameRate);
+    size_t rateAt = C3D::HeaderOffset::EFrameRate;
+    if (const C3DParameter* p = m_rOut.find("POINT", "RATE")) {
+      rate = p->floatValue(0);
+      rateAt = p->offset;
+    }
+    if (!(rate > 0.0 && rate <= 1e6))
+      fail("frame rate " + std::to_string(rate) + " is not between 0 and 1000000", rateAt);
+    m_rOut.frameRate = rate;
+    if (const C3DParameter* p = m_rOut.find("POINT", "UNITS")) {
+      const auto units = p->strings();
+      if (!units.empty()) m_rOut.units = trim(units[0]);
+    }
+  }
+
+  void readLabels() {
+    std::vector<std::string> labels;
+    for (int chunk = 1; labels.size() < size_t(m_rOut.pointCount); ++chunk) {
+      const C3DParameter* p =
+          m_rOut.find("POINT", chunk == 1 ? "LABELS" : "LABELS" + std::to_string(chunk));
+      if (!p) break;
+      for (std::string& label : p->strings())
+        labels.push_back(trim(std::move(label)));
+    }
+    labels.resize(size_t(m_rOut.pointCount));
+    for (size_t i = 0; i < labels.size(); ++i)
+      if (labels[i].empty()) labels[i] = "Point" + std::to_string(i + 1);
+    m_rOut.labels = std::move(labels);
+
+    const C3DParameter* pUses = m_rOut.find("SUBJECTS", "USES_PREFIXES");
+    const C3DParameter* pPrefixes = m_rOut.find("SUBJECTS", "LABEL_PREFIXES");
+    if (!pUses || pUses->intValue(0) == 0 || !pPrefixes) return;
+    const C3DParameter* pNames = m_rOut.find("SUBJECTS", "NAMES");
+    const std::vector<std::string> names = pNames ? pNames->strings() : std::vector<std::string>();
+    const std::vector<std::string> prefixes = pPrefixes->strings();
+    for (size_t i = 0; i < prefixes.size(); ++i) {
+      SubjectPrefix entry{trim(prefixes[i]), i < names.size() ? trim(names[i]) : std::string()};
+      if (entry.prefix.empty()) continue;
+      if (entry.subject.empty()) {
+        entry.subject = entry.prefix;
+        while (!entry.subject.empty() && entry.subject.back() == ':')
+          entry.subject.pop_back();
+      }
+      m_rOut.subjectPrefixes.push_back(std::move(entry));
+    }
+  }
+
+  void readAnalogLayout() {
+    const int perFrame = word(C3D::HeaderOffset::EAnalogPerFrame);
+    int samples = word(C3D::HeaderOffset::ESamplesPerFrame);
+    int channels = 0;
+    if (const C3DParameter* p = m_rOut.find("ANALOG", "USED"))
+      channels = int(p->unsignedValue(0));
+    else if (samples > 0)
+      channels = perFrame / samples;
+    if (channels > 0 && samples == 0) samples = perFrame / channels;
+    if (channels == 0 || samples == 0) channels = samples = 0;
+    m_rOut.analogChannels = channels;
+    m_rOut.analogSamplesPerFrame = samples;
+    if (channels == 0) return;
+    m_rOut.analogRate = m_rOut.frameRate * samples;
+    if (const C3DParameter* p = m_rOut.find("ANALOG", "RATE")) {
+      const double rate = p->floatValue(0);
+      if (rate > 0.0 && std::isfinite(rate)) m_rOut.analogRate = rate;
+    }
+    std::vector<std::string> labels;
+    for (int chunk = 1; labels.size() < size_t(channels); ++chunk) {
+      const C3DParameter* p =
+          m_rOut.find("ANALOG", chunk == 1 ? "LABELS" : "LABELS" + std::to_string(chunk));
+      if (!p) break;
+      for (std::string& label : p->strings())
+        labels.push_back(trim(std::move(label)));
+    }
+    labels.resize(size_t(channels));
+    for (size_t i = 0; i < labels.size(); ++i)
+      if (labels[i].empty()) labels[i] = "Analog" + std::to_string(i + 1);
+    m_rOut.analogLabels = std::move(labels);
+  }
+
+  // Checks that every frame lies inside the file before anything is allocated for it.
+  size_t frameBytes() const {
+    const size_t valueSize = m_rOut.scale < 0.0f ? 4 : 2;
+    return valueSize * (size_t(m_rOut.pointCount) * 4 +
+                        size_t(m_rOut.analogSamplesPerFrame) * size_t(m_rOut.analogChannels));
+  }
+
+  void readPoints() {
+    if (m_dataBlock == 0) fail("the header's data start block is 0", C3D::HeaderOffset::EDataStart);
+    m_dataStart = size_t(m_dataBlock - 1) * C3D::kBlockSize;
+    const size_t bytes = frameBytes();
+    if (m_dataStart > m_size)
+      fail("the frames start at byte " + std::to_string(m_dataStart) + ", past the end of the file",
+           C3D::HeaderOffset::EDataStart);
+    const size_t available = m_size - m_dataStart;
+    if (bytes > 0 && size_t(m_rOut.frameCount) > available / bytes) {
+      // Some writers declare more frames than they wrote; a file that stops at the end of a
+      // frame is read as far as it goes, one that stops inside a frame is truncated.
+      const size_t whole = available / bytes;
+      if (available % bytes != 0)
+        fail("file ends inside frame " + std::to_string(whole + 1) + " of " +
+                 std::to_string(m_rOut.frameCount) + " (frames of " + std::to_string(bytes) +
+                 " bytes from byte " + std::to_string(m_dataStart) + ")",
+             m_size);
+      m_rOut.warnings.push_back("the file declares " + std::to_string(m_rOut.frameCount) +
+                                " frames but holds " + std::to_string(whole) + "; " +
+                                std::to_string(whole) + " read");
+      m_rOut.frameCount = int(whole);
+    }
+    const size_t frames = size_t(m_rOut.frameCount);
+    const bool isFloat = m_rOut.scale < 0.0f;
+    const float scale = std::fabs(m_rOut.scale);
+    const size_t points = size_t(m_rOut.pointCount);
+    if (points == 0) return;
+    m_rOut.points.resize(frames * points * 4);
+    float* pOut = m_rOut.points.data();
+    for (size_t f = 0; f < frames; ++f) {
+      const uint8_t* p = m_pData + m_dataStart + f * bytes;
+      for (size_t i = 0; i < points; ++i, pOut += 4) {
+        if (isFloat) {
+          for (int k = 0; k < 4; ++k)
+            pOut[k] = C3D::getFloat(p + 4 * k, m_rOut.processor);
+          p += 16;
+        } else {
+          for (int k = 0; k < 3; ++k)
+            pOut[k] = float(int16_t(word(size_t(p - m_pData) + 2 * k))) * scale;
+          const int16_t residual = int16_t(word(size_t(p - m_pData) + 6));
+          pOut[3] = residual < 0 ? -1.0f : float(residual & 0xFF) * scale;
+          p += 8;
+        }
+        if (!std::isfinite(pOut[0]) || !std::isfinite(pOut[1]) || !std::isfinite(pOut[2]))
+          pOut[3] = -1.0f;
+      }
+    }
+  }
+
+  void readAnalog() {
+    const size_t channels = size_t(m_rOut.analogChannels);
+    if (channels == 0) return;
+    std::vector<double> offsets(channels, 0.0);
+    if (const C3DParameter* p = m_rOut.find("ANALOG", "OFFSET"))
+      for (size_t c = 0; c < channels && c < p->count(); ++c)
+        offsets[c] = double(p->intValue(c));
+    bool isUnsigned = false;
+    if (const C3DParameter* p = m_rOut.find("ANALOG", "FORMAT")) {
+      const auto format = p->strings();
+      isUnsigned = !format.empty() && upper(trim(format[0])) == "UNSIGNED";
+    }
+    const bool isFloat = m_rOut.scale < 0.0f;
+    const size_t valueSize = isFloat ? 4 : 2;
+    const size_t samples = size_t(m_rOut.analogSamplesPerFrame);
+    const size_t frames = size_t(m_rOut.frameCount);
+    const size_t pointBytes = size_t(m_rOut.pointCount) * 4 * valueSize;
+    m_rOut.analog.resize(frames * samples * channels);
+    double* pOut = m_rOut.analog.data();
+    const size_t bytes = frameBytes();
+    for (size_t f = 0; f < frames; ++f) {
+      size_t at = m_dataStart + f * bytes + pointBytes;
+      for (size_t s = 0; s < samples; ++s)
+        for (size_t c = 0; c < channels; ++c, at += valueSize) {
+          double raw;
+          if (isFloat)
+            raw = C3D::getFloat(m_pData + at, m_rOut.processor);
+          else if (isUnsigned)
+            raw = word(at);
+          else
+            raw = int16_t(word(at));
+          *pOut++ = std::isfinite(raw) ? raw - offsets[c] : 0.0;
+        }
+    }
+  }
+
+  const uint8_t* m_pData;
+  size_t m_size;
+  C3DContent& m_rOut;
+  size_t m_parameterStart = 0;
+  size_t m_dataStart = 0;
+  int m_dataBlock = 0;
+  std::vector<int> m_groupIds;
+};
+
+bool parseC3D(const uint8_t* i_pData, size_t i_size, C3DContent& o_rContent,
+              std::string& o_rError) {
+  o_rContent = C3DContent();
+  try {
+    C3DParser(i_pData, i_size, o_rContent).parse();
+    return true;
+  } catch (const C3DError& e) {
+    o_rError = e.message;
+    return false;
+  }
+}
+
+} // namespace AnvilCore

@@ -1,0 +1,127 @@
+#include "TrajectoryScene.h"
+#include "plugin/host/Character.h"
+#include "plugin/host/Database.h"
+#include "plugin/host/Marker.h"
+#include <map>
+#include <set>
+
+namespace AnvilCore {
+
+namespace {
+std::string lower(std::string i_text) {
+  for (char& c : i_text)
+    if (c >= 'A' && c <= 'Z') c = char(c - 'A' + 'a');
+  return i_text;
+}
+
+Character* topLevelCharacter(Module* i_pRoot, const HString& i_rName) {
+  for (int i = 0; i < i_pRoot->getNumChildren(); ++i) {
+    Module* pChild = i_pRoot->getChild(i);
+    if (pChild->isKindOf(&Character::s_classCharacter) && pChild->getName() == i_rName)
+      return static_cast<Character*>(pChild);
+  }
+  return nullptr;
+}
+} // namespace
+
+void splitTrajectoryLabel(const std::string& i_label, const std::vector<SubjectPrefix>& i_prefixes,
+                          std::string& o_rSubject, std::string& o_rMarker) {
+  const SubjectPrefix* pBest = nullptr;
+  for (const SubjectPrefix& prefix : i_prefixes)
+    if (!prefix.prefix.empty() && !prefix.subject.empty() &&
+        (!pBest || prefix.prefix.size() > pBest->prefix.size()) &&
+        prefix.prefix.size() < i_label.size() &&
+        i_label.compare(0, prefix.prefix.size(), prefix.prefix) == 0)
+      pBest = &prefix;
+  if (pBest) {
+    o_rSubject = pBest->subject;
+    o_rMarker = i_label.substr(pBest->prefix.size());
+    return;
+  }
+  const size_t colon = i_label.rfind(':');
+  if (colon == std::string::npos || colon == 0 || colon + 1 == i_label.size()) {
+    o_rSubject.clear();
+    o_rMarker = i_label;
+    return;
+  }
+  o_rSubject = i_label.substr(0, colon);
+  o_rMarker = i_label.substr(colon + 1);
+}
+
+double millimetresPer(const std::string& i_unit) {
+  const std::string unit = lower(i_unit);
+  if (unit == "mm") return 1.0;
+  if (unit == "cm") return 10.0;
+  if (unit == "m") return 1000.0;
+  if (unit == "in") return 25.4;
+  return 0.0;
+}
+
+TrajectorySceneBuilder::TrajectorySceneBuilder(double i_frameRate,
+                                               const std::vector<std::string>& i_labels,
+                                               const std::vector<SubjectPrefix>& i_prefixes)
+    : m_pStage(std::make_unique<Module>("stage")) {
+  m_clock.setFrameRate(i_frameRate);
+  std::map<std::string, Character*> subjects;
+  std::map<Module*, std::set<std::string>> taken;
+  m_markers.reserve(i_labels.size());
+  for (const std::string& label : i_labels) {
+    std::string subject, name;
+    if (!label.empty() && label[0] == '*') {
+      name = label; // an unlabelled trajectory keeps its "*" name at the top
+    } else {
+      splitTrajectoryLabel(label, i_prefixes, subject, name);
+    }
+    Module* pParent = m_pStage.get();
+    if (!subject.empty()) {
+      Character*& pCharacter = subjects[subject];
+      if (!pCharacter) {
+        pCharacter = new Character(HString(subject));
+        m_pStage->addChild(pCharacter);
+      }
+      pParent = pCharacter;
+    }
+    std::set<std::string>& names = taken[pParent];
+    std::string unique = name;
+    for (int n = 2; !names.insert(unique).second; ++n)
+      unique = name + "_" + std::to_string(n);
+    Marker* pMarker = new Marker(HString(unique));
+    pMarker->setUnlabeled(!label.empty() && label[0] == '*');
+    pParent->addChild(pMarker);
+    m_markers.push_back(pMarker);
+  }
+}
+
+TrajectorySceneBuilder::~TrajectorySceneBuilder() = default;
+
+void TrajectorySceneBuilder::addTopLevel(Module* i_pModule) {
+  m_pStage->addChild(i_pModule);
+}
+
+void TrajectorySceneBuilder::commit(int64_t i_firstFrame, int64_t i_lastFrame) {
+  Module* pRoot = g_db->getRoot();
+  while (m_pStage->getNumChildren() > 0) {
+    Module* pModule = m_pStage->detachChild(m_pStage->getChild(0));
+    Character* pExisting = pModule->isKindOf(&Character::s_classCharacter)
+                               ? topLevelCharacter(pRoot, pModule->getName())
+                               : nullptr;
+    if (!pExisting) {
+      g_db->addToScene(pModule, false, nullptr, false, false);
+      continue;
+    }
+    // The subject is in the scene already: its new markers join it.
+    std::unique_ptr<Module> pNew(pModule);
+    while (pNew->getNumChildren() > 0)
+      g_db->addToScene(pNew->detachChild(pNew->getChild(0)), false, pExisting, false, false);
+  }
+  m_markers.clear();
+  HTimeManager* pTime = g_db->getTimeManager();
+  pTime->setFrameRate(m_clock.getFrameRate());
+  const HTimeRange range(frameTime(i_firstFrame),
+                         frameTime(i_lastFrame < i_firstFrame ? i_firstFrame : i_lastFrame));
+  pTime->setAnimRange(range);
+  pTime->setPlayRange(range);
+  pTime->setCurrentTime(range.getStart());
+}
+
+} // namespace AnvilCore
