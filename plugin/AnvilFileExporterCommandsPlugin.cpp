@@ -1,4 +1,5 @@
 #include "AnvilFileExporterCommandsPlugin.h"
+#include "commands/C3dExportOptionsCmd.h"
 #include "commands/TrcExportOptionsCmd.h"
 #include <new>
 
@@ -8,6 +9,8 @@ AnvilFileExporterCommandsPlugin* AnvilFileExporterCommandsPlugin::createInstance
 
 bool AnvilFileExporterCommandsPlugin::loadCommands() {
   // Option commands join here, in the host's order, as their exporters gain them.
+  m_commands.add(new (std::nothrow) C3dExportOptionsCmd());
+
   m_commands.add(new (std::nothrow) TrcExportOptionsCmd());
   return true;
 }
