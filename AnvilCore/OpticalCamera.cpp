@@ -1,5 +1,4 @@
 #include "plugin/host/OpticalCamera.h"
-#include <cmath>
 
 OpticalCamera::OpticalCamera(const HString& i_rName) : HCamera(i_rName) {}
 
@@ -16,12 +15,7 @@ void OpticalCamera::setSensorSizeMM(double i_width, double i_height) {
 void OpticalCamera::setCalibrationPose(const Vec3& i_rPosition, const Vec3& i_rRotationVector) {
   m_position = i_rPosition;
   m_orientation = i_rRotationVector;
-  const double angle = std::sqrt(i_rRotationVector.x * i_rRotationVector.x +
-                                 i_rRotationVector.y * i_rRotationVector.y +
-                                 i_rRotationVector.z * i_rRotationVector.z);
-  AnvilRotation rotation;
-  if (angle > 0.0) rotation = AnvilRotation(i_rRotationVector, angle * 180.0 / M_PI);
-  setStaticTransform(i_rPosition, rotation, Vec3(1.0, 1.0, 1.0));
+  setPose(i_rPosition, i_rRotationVector);
 }
 
 namespace {

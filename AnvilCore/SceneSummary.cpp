@@ -3,6 +3,8 @@
 #include "plugin/host/Database.h"
 #include "plugin/host/HTimeManager.h"
 #include "plugin/host/Marker.h"
+#include "plugin/host/OpticalCamera.h"
+#include "plugin/host/VideoCamera.h"
 #include "plugin/host/SubjectManager.h"
 #include <cstdio>
 #include <string>
@@ -55,6 +57,18 @@ void describeScene(std::ostream& o_rOut) {
     subjects.push_back(std::string(pSubject->getName().GetStr()) + (pSubject->isProp() ? " (prop)" : ""));
   }
   nameList(o_rOut, "subjects", subjects);
+
+  std::vector<std::string> optical, video;
+  for (int i = 0; i < g_db->getNumOpticalCameras(); ++i) {
+    const OpticalCamera* pCamera = g_db->getOpticalCamera(i);
+    optical.push_back("#" + std::to_string(pCamera->getCameraNumber()) + " \"" +
+                      pCamera->getName().GetString() + "\"" +
+                      (pCamera->isCalibrated() ? "" : " (uncalibrated)"));
+  }
+  for (Module* p : g_db->getModules())
+    if (p->isKindOf(&VideoCamera::s_classVideoCamera)) video.push_back(p->getName().GetString());
+  nameList(o_rOut, "optical cameras", optical);
+  nameList(o_rOut, "video cameras", video);
 }
 
 } // namespace AnvilCore

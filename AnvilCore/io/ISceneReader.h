@@ -19,6 +19,10 @@ public:
   virtual bool read(const std::string& i_path, std::string& o_rError) = 0;
 };
 
+/// Reads a whole file as bytes. On failure returns false with "<path>: cannot open: <reason>" or
+/// "<path>: read error" in `o_rError`.
+bool readWholeFile(const std::string& i_path, std::string& o_rText, std::string& o_rError);
+
 /// The readers known to the host, by extension.
 class SceneReaderRegistry {
 public:

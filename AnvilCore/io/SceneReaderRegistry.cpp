@@ -1,9 +1,29 @@
 #include "ISceneReader.h"
 #include <algorithm>
 #include <cctype>
+#include <cerrno>
+#include <cstring>
 #include <filesystem>
+#include <fstream>
+#include <sstream>
 
 namespace AnvilCore {
+
+bool readWholeFile(const std::string& i_path, std::string& o_rText, std::string& o_rError) {
+  std::ifstream in(i_path, std::ios::binary);
+  if (!in) {
+    o_rError = i_path + ": cannot open: " + std::strerror(errno);
+    return false;
+  }
+  std::ostringstream text;
+  text << in.rdbuf();
+  if (in.bad()) {
+    o_rError = i_path + ": read error";
+    return false;
+  }
+  o_rText = text.str();
+  return true;
+}
 
 SceneReaderRegistry& SceneReaderRegistry::instance() {
   static SceneReaderRegistry s_registry;

@@ -1,0 +1,39 @@
+#pragma once
+// Runs one export through the host's driver into a fresh temporary file and reads it back.
+#include "AnvilCore/ExportDriver.h"
+#include "plugin/host/FileExporter.h"
+#include <filesystem>
+#include <fstream>
+#include <gtest/gtest.h>
+#include <sstream>
+#include <string>
+#include <unistd.h>
+
+namespace ExportTest {
+
+/// A file path in a per-process temporary folder, removed with the folder at exit of the test.
+inline std::string tempPath(const std::string& i_rName) {
+  const std::filesystem::path dir =
+      std::filesystem::temp_directory_path() / ("anvil-export-test-" + std::to_string(::getpid()));
+  std::filesystem::create_directories(dir);
+  return (dir / i_rName).string();
+}
+
+inline std::string readText(const std::string& i_rPath) {
+  std::ifstream in(i_rPath, std::ios::binary);
+  std::ostringstream text;
+  text << in.rdbuf();
+  return text.str();
+}
+
+/// Exports to `i_rPath` and returns the file's text; fails the test when the export fails.
+inline std::string exportText(FileExporter& i_rExporter, const std::string& i_rPath) {
+  AnvilCore::ExportRequest request;
+  request.path = i_rPath;
+  std::string error;
+  const AnvilCore::EExportStatus status = AnvilCore::runExport(i_rExporter, request, error);
+  EXPECT_EQ(status, AnvilCore::EExportStatus::EOk) << error;
+  return readText(i_rPath);
+}
+
+} // namespace ExportTest
