@@ -4,36 +4,24 @@
 
 namespace {
 
-class C3dExportOptionsCmdTest : public OptionCommandTest {
-protected:
-  void SetUp() override {
-    OptionCommandTest::SetUp();
-    m_pExporter = C3DExporter::createInstance();
-    addExporter(m_pExporter);
-  }
-  C3DExporter* m_pExporter = nullptr;
-};
+using C3dExportOptionsCmdTest = ExporterCommandTest<C3DExporter>;
 
 TEST_F(C3dExportOptionsCmdTest, DeclaresItsOptionsInOrder) {
-  Command* pCommand = m_registry.find("c3dExportOptions");
-  ASSERT_NE(pCommand, nullptr);
-  EXPECT_EQ(pCommand->getDescription(), "Set C3D Export Options");
-  EXPECT_EQ(pCommand->getCategory(), "File Handling");
-  EXPECT_EQ(pCommand->getSubCategory(), "");
-  const std::pair<const char*, Variable::VarType> options[] = {
-      {"preserveGaps", Variable::EBool},   {"collapseSubjects", Variable::EBool},
-      {"real", Variable::EBool},           {"writeTimeCode", Variable::EBool},
-      {"writeUnlabeled", Variable::EBool}, {"removeLeadingUnderscore", Variable::EBool},
-      {"decFormat", Variable::EBool},      {"filterMin", Variable::EBool},
-      {"filterMax", Variable::EBool},      {"minKeys", Variable::EInteger},
-      {"maxKeys", Variable::EInteger},     {"overrideHeaderRate", Variable::EBool},
-      {"headerRate", Variable::EFloat},    {"upAxis", Variable::EString}};
-  ASSERT_EQ(pCommand->getNumOptions(), 14);
-  for (int i = 0; i < 14; ++i) {
-    EXPECT_EQ(pCommand->getOption(i)->getName(), options[i].first);
-    EXPECT_EQ(pCommand->getOption(i)->getType(), options[i].second);
-    EXPECT_FALSE(pCommand->getOption(i)->isRequired());
-  }
+  expectDeclaration("c3dExportOptions", "Set C3D Export Options",
+                    {{"preserveGaps", Variable::EBool},
+                     {"collapseSubjects", Variable::EBool},
+                     {"real", Variable::EBool},
+                     {"writeTimeCode", Variable::EBool},
+                     {"writeUnlabeled", Variable::EBool},
+                     {"removeLeadingUnderscore", Variable::EBool},
+                     {"decFormat", Variable::EBool},
+                     {"filterMin", Variable::EBool},
+                     {"filterMax", Variable::EBool},
+                     {"minKeys", Variable::EInteger},
+                     {"maxKeys", Variable::EInteger},
+                     {"overrideHeaderRate", Variable::EBool},
+                     {"headerRate", Variable::EFloat},
+                     {"upAxis", Variable::EString}});
 }
 
 TEST_F(C3dExportOptionsCmdTest, CommandsComeInTheHostsOrder) {

@@ -21,6 +21,22 @@ protected:
   /// The log lines so far as "error: text" / "warning: text".
   const std::vector<std::string>& log() const { return m_log; }
 
+  /// Checks a command's description, category and options (names and types, in order; all
+  /// of arity 1 and optional).
+  void expectDeclaration(const char* i_pName, const char* i_pDescription,
+                         const std::vector<std::pair<const char*, Variable::VarType>>& i_options);
+
   AnvilCore::CommandRegistry m_registry;
   std::vector<std::string> m_log;
+};
+
+/// `OptionCommandTest` with one live exporter of type `TExporter` registered.
+template <typename TExporter> class ExporterCommandTest : public OptionCommandTest {
+protected:
+  void SetUp() override {
+    OptionCommandTest::SetUp();
+    m_pExporter = TExporter::createInstance();
+    addExporter(m_pExporter);
+  }
+  TExporter* m_pExporter = nullptr;
 };

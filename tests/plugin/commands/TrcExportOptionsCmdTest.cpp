@@ -1,35 +1,16 @@
-#include "plugin/commands/TrcExportOptionsCmd.h"
 #include "CommandTestSupport.h"
 #include "exporters/trajectory/TrcExporter.h"
 
 namespace {
 
-class TrcExportOptionsCmdTest : public OptionCommandTest {
-protected:
-  void SetUp() override {
-    OptionCommandTest::SetUp();
-    m_pExporter = TrcExporter::createInstance();
-    addExporter(m_pExporter);
-  }
-  TrcExporter* m_pExporter = nullptr;
-};
+using TrcExportOptionsCmdTest = ExporterCommandTest<TrcExporter>;
 
 TEST_F(TrcExportOptionsCmdTest, DeclaresItsOptionsInOrder) {
-  Command* pCommand = m_registry.find("trcExportOptions");
-  ASSERT_NE(pCommand, nullptr);
-  EXPECT_EQ(pCommand->getDescription(), "Set TRC Export Options");
-  EXPECT_EQ(pCommand->getHelp(), "");
-  EXPECT_EQ(pCommand->getCategory(), "File Handling");
-  EXPECT_EQ(pCommand->getRuntimeClass(), &Command::s_classCommand);
-  const char* names[] = {"writeSubjectNames", "removeLeadingUnderscore", "writeUnlabeled",
-                         "collapseSubjects"};
-  ASSERT_EQ(pCommand->getNumOptions(), 4);
-  for (int i = 0; i < 4; ++i) {
-    EXPECT_EQ(pCommand->getOption(i)->getName(), names[i]);
-    EXPECT_EQ(pCommand->getOption(i)->getType(), Variable::EBool);
-    EXPECT_EQ(pCommand->getOption(i)->getArity(), 1);
-    EXPECT_FALSE(pCommand->getOption(i)->isRequired());
-  }
+  expectDeclaration("trcExportOptions", "Set TRC Export Options",
+                    {{"writeSubjectNames", Variable::EBool},
+                     {"removeLeadingUnderscore", Variable::EBool},
+                     {"writeUnlabeled", Variable::EBool},
+                     {"collapseSubjects", Variable::EBool}});
 }
 
 TEST_F(TrcExportOptionsCmdTest, SetsAndTogglesTheLiveExporter) {
