@@ -57,6 +57,7 @@ TEST(HostStrings, EditingOperations) {
 
 TEST(HostRotation, EulerRoundTripInEveryOrder) {
   const Vec3 angles[] = {{10, 20, 30}, {-75, 40, 170}, {0, -89, 45}, {120, 5, -60}};
+  const int middleAxis[6] = {1, 2, 0, 2, 0, 1};
   for (int order = 0; order < 6; ++order) {
     for (const Vec3& in : angles) {
       AnvilRotation r;
@@ -68,7 +69,8 @@ TEST(HostRotation, EulerRoundTripInEveryOrder) {
       // The same rotation (angles may differ by equivalent sets near the limits).
       const Vec3 v(0.3, -1.2, 2.5);
       expectNear(r.rotate(v), back.rotate(v), 1e-9);
-      if (std::fabs(in.y) < 80) expectNear(in, out, 1e-9);
+      // Angles come back as given while the middle one stays inside (-90, 90).
+      if (std::fabs(in[middleAxis[order]]) < 80) expectNear(in, out, 1e-9);
     }
   }
 }

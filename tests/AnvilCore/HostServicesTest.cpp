@@ -56,6 +56,7 @@ TEST(UserSetup, PersistsTypedValuesAndKeepsDefaults) {
   store.setUserSetupDouble("C3DExporter", "Rate", 0.1, scope);
   store.setUserSetupInt("TRCExporter", "WriteUnlabelled", 1, scope);
   store.setUserSetupString("FBXExporter", "Version", "2019", scope);
+  store.setUserSetupString("FBXExporter", "NamespaceMode", "short", scope);
   ASSERT_TRUE(store.save(error)) << error;
 
   HInterface reread;
@@ -65,7 +66,8 @@ TEST(UserSetup, PersistsTypedValuesAndKeepsDefaults) {
   EXPECT_EQ(reread.getUserSetupInt("TRCExporter", "WriteUnlabelled", 0, scope), 1);
   EXPECT_EQ(reread.getUserSetupString("FBXExporter", "Version", "x", scope), "2019");
   // A value of the wrong type falls back to the default.
-  EXPECT_EQ(reread.getUserSetupInt("FBXExporter", "Version", 3, scope), 3);
+  EXPECT_EQ(reread.getUserSetupInt("FBXExporter", "NamespaceMode", 3, scope), 3);
+  EXPECT_TRUE(reread.getUserSetupBool("FBXExporter", "NamespaceMode", true, scope));
 
   std::ofstream(path) << "[A]\nkey=1\nthis line is wrong\n";
   EXPECT_FALSE(reread.load(path.string(), error));

@@ -3,6 +3,7 @@
 // markers made from plain position lists.
 #include "plugin/host/Character.h"
 #include "plugin/host/Database.h"
+#include "plugin/host/FileExporter.h"
 #include "plugin/host/HTimeManager.h"
 #include "plugin/host/Marker.h"
 #include <optional>

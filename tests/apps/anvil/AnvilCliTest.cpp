@@ -12,7 +12,7 @@
 namespace fs = std::filesystem;
 
 namespace {
-struct Run {
+struct CliRun {
   int code;
   std::string output; // stdout and stderr together
 };
@@ -28,10 +28,10 @@ protected:
   }
   void TearDown() override { fs::remove_all(m_dir); }
 
-  Run anvil(const std::string& i_args) {
+  CliRun anvil(const std::string& i_args) {
     const std::string command = std::string(ANVIL_BIN_DIR) + "/anvil --user-setup '" +
                                 (m_dir / "setup.ini").string() + "' " + i_args + " 2>&1";
-    Run run{-1, {}};
+    CliRun run{-1, {}};
     FILE* pPipe = ::popen(command.c_str(), "r");
     if (!pPipe) return run;
     std::array<char, 4096> buffer;
@@ -55,7 +55,7 @@ std::string line(const std::string& i_path, int i_index) {
 } // namespace
 
 TEST_F(AnvilCli, ExportsTheDemoToTrc) {
-  const Run run = anvil("export demo -o " + path("demo.trc"));
+  const CliRun run = anvil("export demo -o " + path("demo.trc"));
   ASSERT_EQ(run.code, 0) << run.output;
   EXPECT_EQ(line(path("demo.trc"), 0), "PathFileType\t4\t(X/Y/Z)\t" + path("demo.trc"));
   EXPECT_EQ(line(path("demo.trc"), 2), "120.000000\t120.000000\t1200\t44\tmm\t120.000000\t1\t1200");
@@ -63,14 +63,14 @@ TEST_F(AnvilCli, ExportsTheDemoToTrc) {
   // The options were stored for the next run.
   EXPECT_TRUE(fs::exists(path("setup.ini")));
 
-  const Run ranged = anvil("export demo --range 10:19 -o " + path("part.trc"));
+  const CliRun ranged = anvil("export demo --range 10:19 -o " + path("part.trc"));
   ASSERT_EQ(ranged.code, 0) << ranged.output;
   EXPECT_EQ(line(path("part.trc"), 2), "120.000000\t120.000000\t10\t44\tmm\t120.000000\t1\t10");
   EXPECT_EQ(line(path("part.trc"), 5).rfind("10\t0.083333\t", 0), 0u);
 }
 
 TEST_F(AnvilCli, UsageErrorsExitTwoAndWriteNothing) {
-  Run run = anvil("export demo -o " + path("demo.xyz"));
+  CliRun run = anvil("export demo -o " + path("demo.xyz"));
   EXPECT_EQ(run.code, 2);
   EXPECT_NE(run.output.find("no exporter for this extension (known: "), std::string::npos) << run.output;
   EXPECT_NE(run.output.find(".trc"), std::string::npos);
@@ -97,14 +97,14 @@ TEST_F(AnvilCli, UsageErrorsExitTwoAndWriteNothing) {
 }
 
 TEST_F(AnvilCli, UnwritableOutputFailsWithOneMessage) {
-  const Run run = anvil("export demo -o " + path("no/such/folder/x.trc"));
+  const CliRun run = anvil("export demo -o " + path("no/such/folder/x.trc"));
   EXPECT_EQ(run.code, 1);
   EXPECT_NE(run.output.find("cannot create"), std::string::npos) << run.output;
   EXPECT_NE(run.output.find("nothing written"), std::string::npos);
 }
 
 TEST_F(AnvilCli, InfoFormatsAndHelp) {
-  Run run = anvil("info demo");
+  CliRun run = anvil("info demo");
   ASSERT_EQ(run.code, 0) << run.output;
   EXPECT_NE(run.output.find("frame rate: 120 Hz"), std::string::npos) << run.output;
   EXPECT_NE(run.output.find("labelled markers: 41"), std::string::npos);
