@@ -4,6 +4,7 @@
 #include "plugin/host/Marker.h"
 #include <algorithm>
 #include <cmath>
+#include <filesystem>
 
 namespace AnvilCore {
 
@@ -150,6 +151,8 @@ bool readSceneJson(const std::string& i_text, const std::string& i_source, std::
   context.root = std::make_unique<Module>("staging");
   context.frameRate = g_db->getTimeManager()->getFrameRate();
   context.ticksPerFrame = g_db->getTimeManager()->getTicksPerFrame();
+  context.timecodeMode = g_db->getTimeManager()->getTimecodeMode();
+  context.directory = std::filesystem::path(i_source).parent_path().string();
   try {
     json::object(document, "");
     const auto& entries = SceneSectionRegistry::instance().entries();

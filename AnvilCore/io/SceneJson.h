@@ -25,6 +25,10 @@ struct SceneJsonContext {
   int64_t ticksPerFrame = 0;
   /// Whether the file gave an animation range; if not, it becomes the span of the keys read.
   bool animRangeSet = false;
+  /// The timecode mode in force once the file is read: the "time" section's, else the scene's.
+  int timecodeMode = 0;
+  /// Folder of the scene file, against which relative paths in it are resolved.
+  std::string directory;
 };
 
 /// Thrown by the helpers below; carries the JSON path ("/markers/3/positions/12") and a text.

@@ -62,6 +62,7 @@ void readTime(const nlohmann::json& i_rValue, const std::string& i_path,
   int mode = 0;
   if (auto* p = optional(i_rValue, "timecodeMode"))
     mode = static_cast<int>(integer(*p, i_path + "/timecodeMode"));
+  io_rContext.timecodeMode = mode;
   std::optional<int64_t> current;
   if (auto* p = optional(i_rValue, "currentFrame")) current = integer(*p, i_path + "/currentFrame");
   io_rContext.animRangeSet = anim.has_value();

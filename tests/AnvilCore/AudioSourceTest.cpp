@@ -1,5 +1,6 @@
 // Audio sources: resampling (same rate, up, down), the span of a request, WAV files.
 #include "plugin/host/AudioSource.h"
+#include "WavTestFile.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/HTimeManager.h"
 #include <cmath>
@@ -54,34 +55,6 @@ std::string tempFile(const std::string& i_name) {
       std::filesystem::temp_directory_path() / ("anvil-audio-test-" + std::to_string(::getpid()));
   std::filesystem::create_directories(dir);
   return (dir / i_name).string();
-}
-
-void put(std::ofstream& io_rOut, uint32_t i_value, int i_bytes) {
-  for (int b = 0; b < i_bytes; ++b)
-    io_rOut.put(char((i_value >> (8 * b)) & 0xFF));
-}
-
-// A 16-bit PCM WAV file, written by hand so that the loader is checked against the format.
-void writeWav(const std::string& i_path, int i_rate,
-              const std::vector<std::vector<int16_t>>& i_ch) {
-  std::ofstream out(i_path, std::ios::binary);
-  const uint32_t frames = uint32_t(i_ch[0].size()), channels = uint32_t(i_ch.size());
-  const uint32_t dataBytes = frames * channels * 2;
-  out.write("RIFF", 4);
-  put(out, 36 + dataBytes, 4);
-  out.write("WAVEfmt ", 8);
-  put(out, 16, 4);
-  put(out, 1, 2); // PCM
-  put(out, channels, 2);
-  put(out, uint32_t(i_rate), 4);
-  put(out, uint32_t(i_rate) * channels * 2, 4);
-  put(out, channels * 2, 2);
-  put(out, 16, 2);
-  out.write("data", 4);
-  put(out, dataBytes, 4);
-  for (uint32_t i = 0; i < frames; ++i)
-    for (uint32_t c = 0; c < channels; ++c)
-      put(out, uint16_t(i_ch[c][i]), 2);
 }
 
 class AudioSourceTest : public ::testing::Test {
@@ -158,7 +131,7 @@ TEST_F(AudioSourceTest, LoadsWavFilesAndRefusesOthers) {
   const std::string path = tempFile("two.wav");
   const std::vector<std::vector<int16_t>> channels = {{0, 100, -100, 32767, -32768},
                                                       {5, 6, 7, 8, 9}};
-  writeWav(path, 22050, channels);
+  AudioTest::writeWav(path, 22050, channels);
   AudioSource source("Wav");
   std::string error;
   ASSERT_TRUE(source.loadFile(path, error)) << error;
