@@ -6,26 +6,10 @@
 #include "plugin/host/Database.h"
 #include "plugin/host/Marker.h"
 #include <cmath>
-#include <fstream>
-#include <iterator>
 
 namespace AnvilCore {
 
 namespace {
-
-bool readBytes(const std::string& i_path, std::vector<uint8_t>& o_rBytes, std::string& o_rError) {
-  std::ifstream in(i_path, std::ios::binary);
-  if (!in) {
-    o_rError = i_path + ": cannot open the file";
-    return false;
-  }
-  o_rBytes.assign(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
-  if (in.bad()) {
-    o_rError = i_path + ": read error";
-    return false;
-  }
-  return true;
-}
 
 int16_t wrapToInt16(double i_value) {
   const long long v = std::llround(i_value);
@@ -64,23 +48,18 @@ public:
   std::string description() const override { return "C3D motion capture file"; }
 
   bool read(const std::string& i_path, std::string& o_rError) override {
-    std::vector<uint8_t> bytes;
-    if (!readBytes(i_path, bytes, o_rError)) return false;
+    std::string bytes;
+    if (!readWholeFile(i_path, bytes, o_rError)) return false;
     C3DContent content;
     std::string error;
-    if (!parseC3D(bytes.data(), bytes.size(), content, error)) {
+    if (!parseC3D(reinterpret_cast<const uint8_t*>(bytes.data()), bytes.size(), content, error)) {
       o_rError = i_path + ": " + error;
       return false;
     }
-    for (const std::string& warning : content.warnings)
-      g_db->logWarning("%s: %s", i_path.c_str(), warning.c_str());
-    double toMillimetres = millimetresPer(content.units);
-    if (toMillimetres == 0.0) {
-      if (!content.units.empty())
-        g_db->logWarning("%s: unknown POINT:UNITS \"%s\"; read as millimetres", i_path.c_str(),
-                         content.units.c_str());
-      toMillimetres = 1.0;
-    }
+    logReaderWarnings(i_path, content.warnings);
+    // A file without POINT:UNITS is taken as millimetres without a word.
+    const double toMillimetres =
+        content.units.empty() ? 1.0 : fileUnitsToMillimetres(i_path, content.units);
     TrajectorySceneBuilder builder(content.frameRate, content.labels, content.subjectPrefixes);
     for (int m = 0; m < content.pointCount; ++m) {
       HPositionTrack& track = builder.marker(m).m_track;

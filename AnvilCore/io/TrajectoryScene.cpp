@@ -57,6 +57,18 @@ double millimetresPer(const std::string& i_unit) {
   return 0.0;
 }
 
+void logReaderWarnings(const std::string& i_path, const std::vector<std::string>& i_warnings) {
+  for (const std::string& warning : i_warnings)
+    g_db->logWarning("%s: %s", i_path.c_str(), warning.c_str());
+}
+
+double fileUnitsToMillimetres(const std::string& i_path, const std::string& i_unit) {
+  const double factor = millimetresPer(i_unit);
+  if (factor > 0.0) return factor;
+  g_db->logWarning("%s: unknown units \"%s\"; read as millimetres", i_path.c_str(), i_unit.c_str());
+  return 1.0;
+}
+
 TrajectorySceneBuilder::TrajectorySceneBuilder(double i_frameRate,
                                                const std::vector<std::string>& i_labels,
                                                const std::vector<SubjectPrefix>& i_prefixes)

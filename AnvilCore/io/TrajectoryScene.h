@@ -25,6 +25,12 @@ void splitTrajectoryLabel(const std::string& i_label, const std::vector<SubjectP
 /// Multiplier from a unit name ("mm", "cm", "m", "in", any case) to millimetres; 0 when unknown.
 double millimetresPer(const std::string& i_unit);
 
+/// What the two trajectory readers share around their parsers: logging the parser's warnings,
+/// and the multiplier to millimetres of the file's unit (an unknown or empty unit is logged and
+/// read as millimetres).
+void logReaderWarnings(const std::string& i_path, const std::vector<std::string>& i_warnings);
+double fileUnitsToMillimetres(const std::string& i_path, const std::string& i_unit);
+
 /// Builds the markers of one trajectory file apart from the scene, then adds them in one step,
 /// so that a file that fails half-way leaves the scene as it was. Markers of a subject go under
 /// a `Character` of that name (an existing top-level one is reused at commit); a label that

@@ -4,8 +4,6 @@
 #include "TrcReader.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/Marker.h"
-#include <fstream>
-#include <iterator>
 
 namespace AnvilCore {
 
@@ -17,30 +15,16 @@ public:
   std::string description() const override { return "TRC marker trajectories"; }
 
   bool read(const std::string& i_path, std::string& o_rError) override {
-    std::ifstream in(i_path, std::ios::binary);
-    if (!in) {
-      o_rError = i_path + ": cannot open the file";
-      return false;
-    }
-    const std::string text((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
-    if (in.bad()) {
-      o_rError = i_path + ": read error";
-      return false;
-    }
+    std::string text;
+    if (!readWholeFile(i_path, text, o_rError)) return false;
     TrcContent content;
     std::string error;
     if (!parseTrc(text.data(), text.size(), content, error)) {
       o_rError = i_path + ": " + error;
       return false;
     }
-    for (const std::string& warning : content.warnings)
-      g_db->logWarning("%s: %s", i_path.c_str(), warning.c_str());
-    double toMillimetres = millimetresPer(content.units);
-    if (toMillimetres == 0.0) {
-      g_db->logWarning("%s: unknown Units \"%s\"; read as millimetres", i_path.c_str(),
-                       content.units.c_str());
-      toMillimetres = 1.0;
-    }
+    logReaderWarnings(i_path, content.warnings);
+    const double toMillimetres = fileUnitsToMillimetres(i_path, content.units);
     TrajectorySceneBuilder builder(content.dataRate, content.labels);
     for (const TrcContent::Sample& sample : content.samples)
       builder.marker(sample.marker)
