@@ -1,0 +1,99 @@
+// CSM export of 200 markers over 36,000 frames (five minutes at 120 Hz), against the floor of
+// formatting the same numbers with snprintf into memory. Compare the two times of one run.
+#include "exporters/trajectory/CsmExporter.h"
+#include "plugin/host/Character.h"
+#include "plugin/host/Database.h"
+#include "plugin/host/HTimeManager.h"
+#include "plugin/host/Marker.h"
+#include <benchmark/benchmark.h>
+#include <cmath>
+#include <cstdio>
+#include <vector>
+
+namespace {
+
+constexpr int kMarkers = 200;
+constexpr int kFrames = 36000;
+
+std::vector<Marker*>& buildScene() {
+  static std::vector<Marker*> s_markers;
+  if (!s_markers.empty()) return s_markers;
+  g_db->clearScene();
+  HTimeManager* pTime = g_db->getTimeManager();
+  pTime->setFrameRate(120.0);
+  const int64_t tpf = pTime->getTicksPerFrame();
+  pTime->setAnimRange(HTimeRange(0, (kFrames - 1) * tpf));
+  pTime->setPlayRange(HTimeRange(0, (kFrames - 1) * tpf));
+  auto* pSubject = new Character("Bench");
+  g_db->addToScene(pSubject, false, nullptr, false, false);
+  for (int m = 0; m < kMarkers; ++m) {
+    auto* pMarker = new Marker(HString("M" + std::to_string(m)));
+    pMarker->m_track.reserve(kFrames);
+    for (int f = 0; f < kFrames; ++f) {
+      const double t = f / 120.0;
+      pMarker->m_track.setKey(f * tpf, Vec3(1000.0 * std::sin(t + m), 800.0 * std::cos(0.7 * t + m),
+                                            900.0 + 0.5 * m + 100.0 * std::sin(2.0 * t)));
+    }
+    g_db->addToScene(pMarker, false, pSubject, false, false);
+    s_markers.push_back(pMarker);
+  }
+  return s_markers;
+}
+
+// A stream that counts and discards what is written to it.
+FILE* countingStream(long long* o_pCount) {
+  cookie_io_functions_t functions{};
+  functions.write = [](void* i_pCookie, const char*, size_t i_size) -> ssize_t {
+    *static_cast<long long*>(i_pCookie) += static_cast<long long>(i_size);
+    return static_cast<ssize_t>(i_size);
+  };
+  return fopencookie(o_pCount, "w", functions);
+}
+
+void BM_CsmExport(benchmark::State& state) {
+  std::vector<Marker*>& markers = buildScene();
+  CsmExporter* pExporter = CsmExporter::createInstance();
+  long long bytes = 0;
+  FILE* pNull = countingStream(&bytes);
+  pExporter->setStream(pNull);
+  pExporter->setFilePath("bench.csm");
+  for (Marker* pMarker : markers) pExporter->moduleList().add(pMarker);
+  for (auto _ : state) {
+    pExporter->reset();
+    pExporter->write();
+    std::fflush(pNull);
+  }
+  state.SetItemsProcessed(state.iterations() * int64_t(kMarkers) * kFrames);
+  state.SetBytesProcessed(bytes);
+  std::fclose(pNull);
+  pExporter->deleteThis();
+}
+
+// The same numbers taken straight from the tracks and printed into one growing buffer.
+void BM_SnprintfFloor(benchmark::State& state) {
+  std::vector<Marker*>& markers = buildScene();
+  std::vector<char> buffer;
+  for (auto _ : state) {
+    buffer.clear();
+    char text[1024];
+    for (int f = 0; f < kFrames; ++f) {
+      int n = std::snprintf(text, sizeof text, "%d", f);
+      buffer.insert(buffer.end(), text, text + n);
+      for (const Marker* pMarker : markers) {
+        const Vec3& p = pMarker->m_track.getKeyValue(f);
+        n = std::snprintf(text, sizeof text, "  %.3f %.3f %.3f", p.x, p.y, p.z);
+        buffer.insert(buffer.end(), text, text + n);
+      }
+      buffer.push_back('\n');
+    }
+    benchmark::DoNotOptimize(buffer.data());
+  }
+  state.SetItemsProcessed(state.iterations() * int64_t(kMarkers) * kFrames);
+  state.SetBytesProcessed(int64_t(state.iterations()) * int64_t(buffer.size()));
+}
+
+} // namespace
+
+BENCHMARK(BM_CsmExport)->Unit(benchmark::kMillisecond)->Iterations(2);
+BENCHMARK(BM_SnprintfFloor)->Unit(benchmark::kMillisecond)->Iterations(2);
+BENCHMARK_MAIN();
