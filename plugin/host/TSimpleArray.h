@@ -71,7 +71,7 @@ private:
     const int capacity = m_capacity + (i_extra > 0 ? i_extra : m_growStep);
     T* pData = static_cast<T*>(std::malloc(sizeof(T) * static_cast<size_t>(capacity)));
     if (!pData) throw HOutOfMemory();
-    if (m_count > 0 && m_pData) std::memcpy(static_cast<void*>(pData), m_pData, sizeof(T) * m_count);
+    for (int i = 0; i < m_count; ++i) pData[i] = m_pData[i];
     std::free(m_pData);
     m_pData = pData;
     m_capacity = capacity;
