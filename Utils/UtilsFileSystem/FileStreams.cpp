@@ -1,0 +1,75 @@
+#include "Utils/UtilsFileSystem/FileStreams.h"
+
+namespace UtilsFileSystem {
+
+VFileOutputStream::~VFileOutputStream() {
+  Close();
+}
+
+VFileOutputStream& VFileOutputStream::operator=(VFileOutputStream&& other) noexcept {
+  if (this != &other) {
+    Close();
+    m_pFile = std::exchange(other.m_pFile, nullptr);
+  }
+  return *this;
+}
+
+bool VFileOutputStream::Write(const void* pBuffer, std::uint64_t size) {
+  if (!m_pFile) return false;
+  if (size == 0) return true;
+  return std::fwrite(pBuffer, static_cast<std::size_t>(size), 1, m_pFile) != 0;
+}
+
+ZMT::IResult VFileOutputStream::Close() {
+  if (!m_pFile) return ZMT::IResult::InvalidArgument;
+  const ZMT::IResult result = CloseFile(m_pFile);
+  if (result.IsSuccess()) m_pFile = nullptr;
+  return result;
+}
+
+VFileInputStream::~VFileInputStream() {
+  Close();
+}
+
+bool VFileInputStream::Read(void* pBuffer, std::uint64_t size) {
+  if (!m_pFile) {
+    m_Failed = true;
+    return false;
+  }
+  if (size == 0) return true;
+  if (std::fread(pBuffer, static_cast<std::size_t>(size), 1, m_pFile) != 1) {
+    m_Failed = true;
+    return false;
+  }
+  return true;
+}
+
+ZMT::IResult VFileInputStream::Close() {
+  if (!m_pFile) return ZMT::IResult::InvalidArgument;
+  const ZMT::IResult result = CloseFile(m_pFile);
+  if (result.IsSuccess()) m_pFile = nullptr;
+  return result;
+}
+
+bool VFileSeekable::GetSize(std::uint64_t& o_rSize) {
+  const auto [size, result] = GetFileSize(SeekableFile());
+  if (result.IsFailure()) {
+    o_rSize = 0;
+    return false;
+  }
+  o_rSize = static_cast<std::uint64_t>(size);
+  return true;
+}
+
+bool VFileSeekable::GetPosition(std::uint64_t& o_rPosition) {
+  const auto [position, result] = TellFile(SeekableFile());
+  if (result.IsFailure()) return false;
+  o_rPosition = static_cast<std::uint64_t>(position);
+  return true;
+}
+
+bool VFileSeekable::Seek(std::int64_t position) {
+  return SeekFile(SeekableFile(), position, SEEK_SET).IsSuccess();
+}
+
+} // namespace UtilsFileSystem
