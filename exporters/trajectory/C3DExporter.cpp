@@ -183,6 +183,7 @@ void C3DExporter::computeScale() {
 
 bool C3DExporter::write() {
   if (m_modules.isEmpty()) return false;
+  if (!m_pFile) return false; // the host could not open the output
   HTimeManager* pTime = HTimeManager::getInstance();
 
   if (!m_options.m_overrideHeaderRate) {

@@ -72,16 +72,26 @@ void C3DExporter::writeFrames() {
       channels.push_back(std::move(channel));
     }
 
+  // Times only grow, so each marker keeps the index of its first key not before t - T/2: the
+  // gap test is then the track's range count without a search per frame.
+  std::vector<size_t> firstKey(size_t(m_markers.getCount()), 0);
+
   std::vector<uint8_t> buffer(frameSize);
   std::fseek(m_pFile, long(m_dataStartBlock - 1) * C3D::kBlockSize, SEEK_SET);
   int frameIndex = 0;
   for (HTime t = m_timeRange.getStart(); t <= m_timeRange.getEnd(); t += ticksPerFrame) {
     uint8_t* p = buffer.data();
-    const HTimeRange around(t - half, t - half + 2 * half);
-    for (const Marker* pMarker : m_markers) {
-      int firstKey = 0;
-      const bool present =
-          !m_options.m_preserveGaps || pMarker->m_track.getKeysInRange(around, firstKey) > 0;
+    const HTime low = t - half, high = t - half + 2 * half;
+    for (int m = 0; m < m_markers.getCount(); ++m) {
+      const Marker* pMarker = m_markers[m];
+      bool present = true;
+      if (m_options.m_preserveGaps) {
+        const std::vector<HTime>& times = pMarker->m_track.times();
+        size_t& k = firstKey[size_t(m)];
+        while (k < times.size() && times[k] < low)
+          ++k;
+        present = k < times.size() && times[k] <= high;
+      }
       const Vec3 pos = present ? pMarker->getWSPos(t) : Vec3();
       if (real) {
         for (int axis = 0; axis < 3; ++axis, p += 4)

@@ -220,3 +220,17 @@ TEST_F(C3DExportTest, FramesPast0xFFFEUseTheDruRecords) {
   EXPECT_EQ(g.u16(8), 65530);
   EXPECT_NE(g.find("POINT", "DRU_FIRST_FRAME"), nullptr);
 }
+
+TEST_F(C3DExportTest, GapTestLooksHalfAFrameEachWay) {
+  const HTime half = time()->getTicksPerFrame() / 2;
+  Marker* pMarker = new Marker("Off");
+  pMarker->m_track.setKey(frame(1) + half, Vec3(1, 1, 1));     // ends of frames 1 and 2
+  pMarker->m_track.setKey(frame(4) - half - 1, Vec3(2, 2, 2)); // inside frame 3 only
+  g_db->addChild(nullptr, pMarker);
+  ASSERT_TRUE(exportRange(0, 4));
+  const C3DTest::File f = file();
+  std::vector<bool> present;
+  for (int fr = 0; fr < 5; ++fr)
+    present.push_back(f.real(dataStart(f) + size_t(fr) * 16 + 12) == 0.0);
+  EXPECT_EQ(present, (std::vector<bool>{false, true, true, true, false}));
+}
