@@ -1,0 +1,134 @@
+// C3D export of a long take: 200 markers x 36,000 frames (five minutes at 120 Hz), in float and
+// integer form, against writing the same number of bytes with one plain fwrite per frame. The
+// ratios of each export to its floor are printed after the table.
+#include "AnvilCore/ExportDriver.h"
+#include "exporters/trajectory/C3DExporter.h"
+#include "plugin/host/Database.h"
+#include "plugin/host/HTimeManager.h"
+#include "plugin/host/Marker.h"
+#include "plugin/host/OperationStack.h"
+#include <benchmark/benchmark.h>
+#include <cmath>
+#include <cstdio>
+#include <filesystem>
+#include <map>
+#include <string>
+#include <unistd.h>
+#include <vector>
+
+namespace {
+constexpr int kMarkers = 200;
+constexpr int kFrames = 36000;
+
+void buildScene() {
+  static bool s_built = false;
+  if (s_built) return;
+  s_built = true;
+  g_db->clearScene();
+  HTimeManager* pTime = g_db->getTimeManager();
+  pTime->setFrameRate(120.0);
+  const int64_t tpf = pTime->getTicksPerFrame();
+  pTime->setAnimRange(HTimeRange(0, (kFrames - 1) * tpf));
+  for (int m = 0; m < kMarkers; ++m) {
+    auto* pMarker = new Marker(HString("Subject:M" + std::to_string(m)));
+    pMarker->m_track.reserve(kFrames);
+    for (int f = 0; f < kFrames; ++f)
+      if ((f + 37 * m) % 500 > 3) // a short gap now and then
+        pMarker->m_track.setKey(f * tpf, Vec3(1000.0 * std::sin(f * 0.01 + m), 500.0 + m,
+                                              1200.0 * std::cos(f * 0.013 - m)));
+    g_db->addToScene(pMarker, false, nullptr, false, false);
+  }
+  g_theOperationStack.setStream(nullptr, false);
+}
+
+std::string outputPath(const char* i_pSuffix) {
+  return (std::filesystem::temp_directory_path() /
+          ("anvil-bench-" + std::to_string(::getpid()) + i_pSuffix))
+      .string();
+}
+
+// File size of each form's export, for its floor.
+std::map<bool, uintmax_t>& exportedBytes() {
+  static std::map<bool, uintmax_t> s_bytes;
+  return s_bytes;
+}
+
+void BM_C3DExport(benchmark::State& state) {
+  buildScene();
+  const bool real = state.range(0) != 0;
+  C3DExporter* pExporter = C3DExporter::createInstance();
+  pExporter->setRealFormat(real);
+  AnvilCore::ExportRequest request;
+  request.path = outputPath(".c3d");
+  std::string error;
+  for (auto _ : state) {
+    if (AnvilCore::runExport(*pExporter, request, error) != AnvilCore::EExportStatus::EOk)
+      state.SkipWithError(error.c_str());
+  }
+  const uintmax_t bytes = std::filesystem::file_size(request.path);
+  exportedBytes()[real] = bytes;
+  state.SetBytesProcessed(int64_t(state.iterations()) * int64_t(bytes));
+  state.counters["frames/s"] =
+      benchmark::Counter(double(kFrames) * double(state.iterations()), benchmark::Counter::kIsRate);
+  state.SetLabel(real ? "float" : "integer");
+  std::filesystem::remove(request.path);
+  pExporter->deleteThis();
+}
+
+// The floor: the same file size, the parameter blocks in one fwrite, then one fwrite per frame.
+void BM_PlainFwrite(benchmark::State& state) {
+  const bool real = state.range(0) != 0;
+  const size_t frameSize = (real ? 4 : 2) * 4 * size_t(kMarkers);
+  const uintmax_t total = exportedBytes()[real];
+  const size_t headBytes = total > frameSize * kFrames ? size_t(total - frameSize * kFrames) : 0;
+  std::vector<uint8_t> head(headBytes, 1), frame(frameSize, 2);
+  const std::string path = outputPath(".raw");
+  for (auto _ : state) {
+    FILE* pFile = std::fopen(path.c_str(), "wb");
+    std::fwrite(head.data(), 1, head.size(), pFile);
+    for (int f = 0; f < kFrames; ++f) {
+      frame[0] = uint8_t(f);
+      std::fwrite(frame.data(), 1, frame.size(), pFile);
+    }
+    std::fclose(pFile);
+  }
+  state.SetBytesProcessed(int64_t(state.iterations()) * int64_t(total));
+  state.SetLabel(real ? "float" : "integer");
+  std::filesystem::remove(path);
+}
+
+// Keeps the mean time of each run so that the ratios can be printed at the end.
+class RatioReporter : public benchmark::ConsoleReporter {
+public:
+  void ReportRuns(const std::vector<Run>& i_runs) override {
+    for (const Run& run : i_runs)
+      m_seconds[run.benchmark_name()] = run.GetAdjustedRealTime();
+    ConsoleReporter::ReportRuns(i_runs);
+  }
+  void printRatios() const {
+    for (const char* pForm : {"0", "1"}) {
+      const auto exported = m_seconds.find(std::string("BM_C3DExport/") + pForm);
+      const auto floor = m_seconds.find(std::string("BM_PlainFwrite/") + pForm);
+      if (exported == m_seconds.end() || floor == m_seconds.end()) continue;
+      std::printf("C3D %s export / plain fwrite of the same bytes: %.2f\n",
+                  pForm[0] == '1' ? "float" : "integer", exported->second / floor->second);
+    }
+  }
+
+private:
+  std::map<std::string, double> m_seconds;
+};
+} // namespace
+
+// Each export runs before its floor, which needs the export's file size.
+BENCHMARK(BM_C3DExport)->Arg(1)->Arg(0)->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_PlainFwrite)->Arg(1)->Arg(0)->Unit(benchmark::kMillisecond);
+
+int main(int argc, char** argv) {
+  benchmark::Initialize(&argc, argv);
+  RatioReporter reporter;
+  benchmark::RunSpecifiedBenchmarks(&reporter);
+  reporter.printRatios();
+  benchmark::Shutdown();
+  return 0;
+}
