@@ -87,7 +87,11 @@ bool VSchemaNode::Attribute(const std::string& name, std::string&, const std::st
   auto* attribute = doc.allocate_node(rapidxml::node_element, "xsd:attribute");
   AppendAttribute(doc, attribute, "name", name);
   AppendAttribute(doc, attribute, "type", type);
-  if (required) AppendAttribute(doc, attribute, "use", "required");
+  // One schema serves every version: an attribute required only within version limits can't be
+  // required of files outside them, so only an unlimited one is marked.
+  if (required && !lower.IsValid() && !upper.IsValid()) {
+    AppendAttribute(doc, attribute, "use", "required");
+  }
   AppendAnnotation(attribute, documentation, lower, upper);
   m_Attributes.push_back(attribute);
   return false;

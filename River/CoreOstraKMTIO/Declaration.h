@@ -1,0 +1,107 @@
+#pragma once
+// The grammar of the subject file language, stated once as declaration functions over INode.
+// Run over VReaderNode they read a file into subject records; run over VSchemaNode they emit
+// the XSD. Each element has its own function; the context carries the records being filled.
+
+#include "River/CoreOstraKMTIO/KMTLanguage.h"
+#include "River/CoreOstraKMTIO/SubjectKMTExtras.h"
+#include "River/CoreOstraTypes/VSubjectApplicationData.h"
+#include "River/CoreOstraTypes/VSubjectDynamicSubspace.h"
+#include "River/CoreOstraTypes/VSubjectParametrised.h"
+#include "Utils/UtilsRapidXml/INode.h"
+#include "Utils/UtilsRapidXml/ReadAttributes.h"
+
+#include <array>
+#include <cstdint>
+#include <optional>
+#include <string>
+
+namespace CoreOstraKMTIO::Detail {
+
+using UtilsRapidXml::INode;
+
+inline const std::string XsdString = "xsd:string";
+inline const std::string XsdDouble = "xsd:double";
+inline const std::string XsdId = "xsd:ID";
+inline const std::string XsdIdRef = "xsd:IDREF";
+
+/// Deepest segment nesting a file may have; deeper files are refused rather than recursed.
+inline constexpr std::uint32_t MaxSegmentDepth = 1000;
+
+/// What one read fills, and the lookups the declaration needs.
+struct VReadContext {
+  CoreOstraTypes::VSubjectParametrised& m_rSubject;
+  CoreOstraTypes::VSubjectApplicationData& m_rAppData;
+  CoreOstraTypes::VSubjectDynamicSubspace& m_rSubspace;
+  VSubjectKMTExtras& m_rExtras;
+  IVersion m_MinVersion = MinVersion;
+  IVersion m_MaxVersion = MaxVersion;
+  IVersion m_FileVersion{1, 0};
+  bool m_Refused = false; ///< the root refused the file (version or development flag)
+
+  std::optional<std::uint32_t> FindSegment(const std::string& name) const;
+  std::optional<std::uint32_t> FindMarker(const std::string& name) const;
+};
+
+/// The document: one KinematicModel.
+void DeclareDocument(INode& node, VReadContext& context);
+void DeclareKinematicModel(INode& node, VReadContext& context);
+void DeclareParameters(INode& node, VReadContext& context);
+void DeclareSkeleton(INode& node, VReadContext& context);
+void DeclareMarkerSet(INode& node, VReadContext& context);
+void DeclareTargetSet(INode& node, VReadContext& context);
+void DeclareSubspace(INode& node, VReadContext& context);
+
+// Typed helpers over the attribute readers of the schema layer.
+
+/// Exactly N expressions into a fixed array.
+template <std::size_t N>
+bool ReadExpressions(INode& node, const std::string& name, std::array<std::string, N>& o_rValue,
+                     const std::string& documentation, bool required,
+                     const IVersion& lower = Versions::None,
+                     const IVersion& upper = Versions::None) {
+  std::vector<std::string> values;
+  if (!UtilsRapidXml::ReadExpressionList(node, name, values, N, 0, documentation, XsdString,
+                                         required, lower, upper)) {
+    return false;
+  }
+  std::copy(values.begin(), values.end(), o_rValue.begin());
+  return true;
+}
+
+/// Exactly N numbers into a fixed array.
+template <std::size_t N>
+bool ReadNumbers(INode& node, const std::string& name, std::array<double, N>& o_rValue,
+                 const std::string& documentation, const IVersion& lower = Versions::None,
+                 const IVersion& upper = Versions::None) {
+  std::vector<double> values;
+  if (!UtilsRapidXml::ReadDoubleList(node, name, values, N, 0, documentation, XsdString, false,
+                                     lower, upper)) {
+    return false;
+  }
+  std::copy(values.begin(), values.end(), o_rValue.begin());
+  return true;
+}
+
+/// A list of numbers of a given count (AnyCount for any) into a vector.
+bool ReadNumberList(INode& node, const std::string& name, std::vector<double>& o_rValues,
+                    std::size_t count, const std::string& documentation, bool required = false,
+                    const IVersion& lower = Versions::None, const IVersion& upper = Versions::None);
+
+/// A plain text attribute.
+bool ReadText(INode& node, const std::string& name, std::string& o_rValue,
+              const std::string& documentation, bool required = false,
+              const IVersion& lower = Versions::None, const IVersion& upper = Versions::None);
+
+/// HIDDEN: stores its negation in `io_rVisible`.
+bool ReadHidden(INode& node, bool& io_rVisible, const std::string& documentation, bool required,
+                const IVersion& lower = Versions::None);
+
+/// OPACITY: a number clamped to 0..255 as the alpha byte; 255 when absent.
+std::uint8_t ReadOpacity(INode& node, const std::string& documentation,
+                         const IVersion& lower = Versions::None);
+
+/// A direction made unit when it is at least 0.001 long; otherwise left as it is.
+std::array<double, 3> NormaliseDirection(const std::array<double, 3>& direction);
+
+} // namespace CoreOstraKMTIO::Detail
