@@ -15,8 +15,8 @@ void HCameraConverter::convertOpticalCameraToVCameraHardware(const OpticalCamera
   o_rHardware.m_PixelAspectRatio = i_rCamera.getPixelAspectRatio();
 }
 
-void HCameraConverter::convertOpticalCameraToVCameraCalibration(const OpticalCamera& i_rCamera,
-                                                                VCameraCalibration& o_rCalibration) {
+void HCameraConverter::convertOpticalCameraToVCameraCalibration(
+    const OpticalCamera& i_rCamera, VCameraCalibration& o_rCalibration) {
   o_rCalibration = VCameraCalibration();
   o_rCalibration.m_Name = i_rCamera.getCalibrationName().GetString();
   const Vec3& orientation = i_rCamera.getCalibrationOrientation();

@@ -57,7 +57,8 @@ void BM_CsmExport(benchmark::State& state) {
   FILE* pNull = countingStream(&bytes);
   pExporter->setStream(pNull);
   pExporter->setFilePath("bench.csm");
-  for (Marker* pMarker : markers) pExporter->moduleList().add(pMarker);
+  for (Marker* pMarker : markers)
+    pExporter->moduleList().add(pMarker);
   for (auto _ : state) {
     pExporter->reset();
     pExporter->write();

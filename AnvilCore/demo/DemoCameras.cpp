@@ -21,15 +21,17 @@ const Vec3 kVolumeCentre(0.0, 0.0, 1000.0);
 Vec3 cross(const Vec3& a, const Vec3& b) {
   return Vec3(a.y * b.z - a.z * b.y, a.z * b.x - a.x * b.z, a.x * b.y - a.y * b.x);
 }
-Vec3 unit(const Vec3& v) { return v * (1.0 / std::sqrt(v.x * v.x + v.y * v.y + v.z * v.z)); }
+Vec3 unit(const Vec3& v) {
+  return v * (1.0 / std::sqrt(v.x * v.x + v.y * v.y + v.z * v.z));
+}
 
 // Rotation vector of a camera at `i_rFrom` whose -Z looks at `i_rTo`, with +Y towards world +Z.
 Vec3 lookAt(const Vec3& i_rFrom, const Vec3& i_rTo) {
   const Vec3 forward = unit(i_rTo - i_rFrom);
   const Vec3 right = unit(cross(forward, Vec3(0.0, 0.0, 1.0)));
   const Vec3 up = cross(right, forward);
-  const double m[9] = {right.x, up.x, -forward.x, right.y, up.y, -forward.y,
-                       right.z, up.z, -forward.z};
+  const double m[9] = {right.x,    up.x,    -forward.x, right.y,   up.y,
+                       -forward.y, right.z, up.z,       -forward.z};
   AnvilRotation rotation;
   rotation.setMatrix(m);
   double x, y, z, w;
@@ -46,8 +48,8 @@ VCameraCalibrationDetail detail(int i_number, ECameraCalibrationType i_type, int
   d.m_StartTemperature = 30 + i_number % 4;
   d.m_EndTemperature = 31 + i_number % 4;
   // 2024-03-01 09:00:00 UTC, minus whole hours, plus a few seconds per camera.
-  d.m_StartTime = 1709283600000ull - std::uint64_t(i_hoursAgo) * 3600000ull +
-                  std::uint64_t(i_number) * 1250ull;
+  d.m_StartTime =
+      1709283600000ull - std::uint64_t(i_hoursAgo) * 3600000ull + std::uint64_t(i_number) * 1250ull;
   d.m_EndTime = d.m_StartTime + 95000ull;
   for (size_t b = 0; b < d.m_Id.size(); ++b)
     d.m_Id[b] = static_cast<std::uint8_t>((i_number * 37 + int(b) * 11 + i_hoursAgo) & 0xFF);
@@ -69,7 +71,8 @@ void addOpticalCamera(int i_number) {
   mask.m_GridWidth = 128;
   mask.m_GridHeight = 68;
   // One masked strip per camera, as run lengths of clear and masked tiles.
-  mask.m_Data = "0:" + std::to_string(128 * (20 + i_number)) + " 1:" + std::to_string(3 + i_number) +
+  mask.m_Data = "0:" + std::to_string(128 * (20 + i_number)) +
+                " 1:" + std::to_string(3 + i_number) +
                 " 0:" + std::to_string(128 * 68 - 128 * (20 + i_number) - 3 - i_number);
   pCamera->setMaskGrid(mask);
 
@@ -102,7 +105,8 @@ void addOpticalCamera(int i_number) {
 
 void addCameras() {
   g_db->getCalibrationMgr()->setVolumeProperties({-7000, 7000, -3500, 3500});
-  for (int number = 1; number <= kOpticalCameras; ++number) addOpticalCamera(number);
+  for (int number = 1; number <= kOpticalCameras; ++number)
+    addOpticalCamera(number);
   auto* pVideo = new VideoCamera("Reference video");
   pVideo->setVideoFile("reference_video.avi");
   const Vec3 position(0.0, -6500.0, 1700.0);

@@ -46,7 +46,8 @@ VCameraMaskGrid readMask(const nlohmann::json& i_rValue, const std::string& i_pa
 VCameraLensDistortion readDistortion(const nlohmann::json& i_rValue, const std::string& i_path) {
   json::onlyKeys(i_rValue, i_path, {"model", "radial", "centre"});
   VCameraLensDistortion distortion;
-  const std::string model = json::string(json::member(i_rValue, i_path, "model"), i_path + "/model");
+  const std::string model =
+      json::string(json::member(i_rValue, i_path, "model"), i_path + "/model");
   size_t count = 2;
   if (model == "Ostra3Parameter") {
     distortion.m_Model = ECameraDistortionModel::Ostra3Parameter;
@@ -130,7 +131,8 @@ void readOptical(const nlohmann::json& i_rValue, const std::string& i_path,
   checkUniqueName(io_rContext.root.get(), name, i_path + "/name");
   auto pCamera = std::make_unique<OpticalCamera>(HString(name));
   pCamera->setCameraNumber(int32(member(i_rValue, i_path, "number"), i_path + "/number"));
-  pCamera->setDeviceURN(HString(string(member(i_rValue, i_path, "deviceUrn"), i_path + "/deviceUrn")));
+  pCamera->setDeviceURN(
+      HString(string(member(i_rValue, i_path, "deviceUrn"), i_path + "/deviceUrn")));
   auto text = [&](const char* i_pKey, void (OpticalCamera::*i_set)(const HString&)) {
     if (auto* p = optional(i_rValue, i_pKey))
       (pCamera.get()->*i_set)(HString(string(*p, i_path + "/" + i_pKey)));
@@ -167,7 +169,8 @@ void readVideo(const nlohmann::json& i_rValue, const std::string& i_path,
   const std::string name = json::name(member(i_rValue, i_path, "name"), i_path + "/name");
   checkUniqueName(io_rContext.root.get(), name, i_path + "/name");
   auto pCamera = std::make_unique<VideoCamera>(HString(name));
-  if (auto* p = optional(i_rValue, "file")) pCamera->setVideoFile(HString(string(*p, i_path + "/file")));
+  if (auto* p = optional(i_rValue, "file"))
+    pCamera->setVideoFile(HString(string(*p, i_path + "/file")));
   Vec3 position, rotationVector;
   if (auto* p = optional(i_rValue, "position")) position = vector3(*p, i_path + "/position");
   if (auto* p = optional(i_rValue, "orientation"))

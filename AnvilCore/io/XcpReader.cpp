@@ -33,8 +33,10 @@ std::array<double, 3> rotationVectorOfQuaternion(const std::array<double, 4>& i_
   // the quaternion back exactly, so that documents survive reading and writing unchanged.
   constexpr int kSteps = 3;
   auto step = [](double i_value, int i_count) {
-    for (; i_count > 0; --i_count) i_value = std::nextafter(i_value, HUGE_VAL);
-    for (; i_count < 0; ++i_count) i_value = std::nextafter(i_value, -HUGE_VAL);
+    for (; i_count > 0; --i_count)
+      i_value = std::nextafter(i_value, HUGE_VAL);
+    for (; i_count < 0; ++i_count)
+      i_value = std::nextafter(i_value, -HUGE_VAL);
     return i_value;
   };
   for (int i = -kSteps; i <= kSteps; ++i)
@@ -86,14 +88,16 @@ public:
     std::vector<double> values;
     const char* p = i_rText.c_str();
     while (true) {
-      while (*p == ' ' || *p == '\t' || *p == '\n' || *p == '\r') ++p;
+      while (*p == ' ' || *p == '\t' || *p == '\n' || *p == '\r')
+        ++p;
       if (!*p) break;
       char* pEnd = nullptr;
       errno = 0;
       const double value = std::strtod(p, &pEnd);
       if (pEnd == p || (*pEnd && *pEnd != ' ' && *pEnd != '\t' && *pEnd != '\n' && *pEnd != '\r'))
         fail(i_pAttribute, "\"" + i_rText + "\" is not a list of numbers");
-      if (!std::isfinite(value)) fail(i_pAttribute, "\"" + i_rText + "\" holds a non-finite number");
+      if (!std::isfinite(value))
+        fail(i_pAttribute, "\"" + i_rText + "\" holds a non-finite number");
       values.push_back(value);
       p = pEnd;
     }
@@ -133,7 +137,8 @@ std::uint64_t parseLocalTime(const ElementReader& i_rReader, const char* i_pAttr
       local.tm_mon < 1 || local.tm_mon > 12 || local.tm_mday < 1 || local.tm_mday > 31 ||
       local.tm_hour > 23 || local.tm_min > 59 || local.tm_sec > 60 || local.tm_year < 1970)
     i_rReader.fail(i_pAttribute,
-                   "expected \"YYYY-MM-DD hh:mm:ss.mmm ST\" or \"... DST\", found \"" + text + "\"");
+                   "expected \"YYYY-MM-DD hh:mm:ss.mmm ST\" or \"... DST\", found \"" + text +
+                       "\"");
   local.tm_year -= 1900;
   local.tm_mon -= 1;
   local.tm_isdst = daylight ? 1 : 0;
@@ -273,7 +278,8 @@ XcpScene readScene(const Element* i_pRoot) {
   const ElementReader reader(i_pRoot, "element Cameras");
   const std::string version = reader.text("VERSION");
   if (version != "1.0" && version != "2.0")
-    reader.fail("VERSION", "unsupported version \"" + version + "\" (this build reads 1.0 and 2.0)");
+    reader.fail("VERSION",
+                "unsupported version \"" + version + "\" (this build reads 1.0 and 2.0)");
   XcpScene scene;
   if (const char* pAxis = reader.find("UP_AXIS")) {
     if (std::strcmp(pAxis, "Y") && std::strcmp(pAxis, "Z"))
@@ -315,7 +321,8 @@ bool readXcpDocument(const std::string& i_text, const std::string& i_source,
     return false;
   }
   const Element* pRoot = document.first_node();
-  while (pRoot && pRoot->type() != rapidxml::node_element) pRoot = pRoot->next_sibling();
+  while (pRoot && pRoot->type() != rapidxml::node_element)
+    pRoot = pRoot->next_sibling();
   if (!pRoot || std::strcmp(pRoot->name(), "Cameras") != 0) {
     o_rError = i_source + ": the root element must be Cameras" +
                (pRoot ? std::string(", found ") + pRoot->name() : std::string());

@@ -8,8 +8,7 @@ namespace AnvilCore {
 /// camera per `Camera` element, the floor's extents and the up axis. On failure returns false
 /// with a message naming the element and attribute at fault, and the scene is unchanged.
 /// `i_source` names the document in messages.
-bool readXcpDocument(const std::string& i_text, const std::string& i_source,
-                     std::string& o_rError);
+bool readXcpDocument(const std::string& i_text, const std::string& i_source, std::string& o_rError);
 
 /// The rotation vector whose quaternion (as the document writer computes it) is `i_rQ` (x, y, z,
 /// w), bit for bit where such a vector exists near the exact inverse; otherwise the nearest one

@@ -15,7 +15,7 @@ public:
   /// Rotation vector (axis times angle in radians) taking camera axes to world axes. The camera
   /// looks along its local -Z with +Y up.
   std::array<double, 3> m_Orientation{0.0, 0.0, 0.0};
-  std::array<double, 3> m_Position{0.0, 0.0, 0.0}; ///< world millimetres
+  std::array<double, 3> m_Position{0.0, 0.0, 0.0};  ///< world millimetres
   std::array<double, 2> m_PrincipalPoint{0.0, 0.0}; ///< pixels
   VCameraLensDistortion m_LensDistortionCalibration;
   double m_FocalLength = 0.0; ///< pixels

@@ -23,12 +23,18 @@ enum class ECameraCalibrationType : std::uint8_t {
 /// Name of a type as files spell it; "Unspecified" for a value outside the enumeration.
 inline const char* CameraCalibrationTypeName(ECameraCalibrationType i_type) {
   switch (i_type) {
-  case ECameraCalibrationType::NotSet: return "NotSet";
-  case ECameraCalibrationType::Legacy: return "Legacy";
-  case ECameraCalibrationType::WandWave: return "WandWave";
-  case ECameraCalibrationType::SessionBasedAutoHeal: return "SessionBasedAutoHeal";
-  case ECameraCalibrationType::AutoBumpHeal: return "AutoBumpHeal";
-  case ECameraCalibrationType::ManualBumpHeal: return "ManualBumpHeal";
+  case ECameraCalibrationType::NotSet:
+    return "NotSet";
+  case ECameraCalibrationType::Legacy:
+    return "Legacy";
+  case ECameraCalibrationType::WandWave:
+    return "WandWave";
+  case ECameraCalibrationType::SessionBasedAutoHeal:
+    return "SessionBasedAutoHeal";
+  case ECameraCalibrationType::AutoBumpHeal:
+    return "AutoBumpHeal";
+  case ECameraCalibrationType::ManualBumpHeal:
+    return "ManualBumpHeal";
   }
   return "Unspecified";
 }
@@ -36,15 +42,18 @@ inline const char* CameraCalibrationTypeName(ECameraCalibrationType i_type) {
 /// The documentation line of a type; empty for `NotSet` and for values outside the enumeration.
 inline const char* CameraCalibrationTypeDescription(ECameraCalibrationType i_type) {
   switch (i_type) {
-  case ECameraCalibrationType::Legacy: return "Support legacy calibration data.";
-  case ECameraCalibrationType::WandWave: return "Generated using standard wand wave";
+  case ECameraCalibrationType::Legacy:
+    return "Support legacy calibration data.";
+  case ECameraCalibrationType::WandWave:
+    return "Generated using standard wand wave";
   case ECameraCalibrationType::SessionBasedAutoHeal:
     return "Generated using session-based auto heal method";
   case ECameraCalibrationType::AutoBumpHeal:
     return "Generated using automatically started and terminated";
   case ECameraCalibrationType::ManualBumpHeal:
     return "Centroid was generated using the FitSlow algorithm in software.";
-  default: return "";
+  default:
+    return "";
   }
 }
 

@@ -16,8 +16,10 @@ enum class ECameraDistortionModel : std::int32_t {
 /// Name of a model as files spell it; "<Unknown>" for a value outside the enumeration.
 inline const char* CameraDistortionModelName(ECameraDistortionModel i_model) {
   switch (i_model) {
-  case ECameraDistortionModel::Ostra2Parameter: return "Ostra2Parameter";
-  case ECameraDistortionModel::Ostra3Parameter: return "Ostra3Parameter";
+  case ECameraDistortionModel::Ostra2Parameter:
+    return "Ostra2Parameter";
+  case ECameraDistortionModel::Ostra3Parameter:
+    return "Ostra3Parameter";
   }
   return "<Unknown>";
 }

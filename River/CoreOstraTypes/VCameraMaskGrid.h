@@ -10,7 +10,7 @@ class VCameraMaskGrid {
 public:
   /// The grid's tiles as run-length text, row by row; empty for an unmasked camera.
   std::string m_Data;
-  std::int32_t m_TileWidth = 0;  ///< pixels per tile
+  std::int32_t m_TileWidth = 0; ///< pixels per tile
   std::int32_t m_TileHeight = 0;
   std::int32_t m_GridWidth = 0;  ///< tiles per row
   std::int32_t m_GridHeight = 0; ///< rows of tiles

@@ -6,7 +6,9 @@
 #include "plugin/host/OpticalCamera.h"
 #include <map>
 
-XCPExporter* XCPExporter::createInstance() { return new XCPExporter(); }
+XCPExporter* XCPExporter::createInstance() {
+  return new XCPExporter();
+}
 
 XCPExporter::XCPExporter() : FileExporter(false, "xcp", true) {}
 
@@ -24,8 +26,7 @@ XcpCameraRecord recordOf(const OpticalCamera& i_rCamera) {
     HCameraConverter::convertOpticalCameraToVCameraCalibration(i_rCamera, record.m_Calibration);
   record.m_DetailsPresent = i_rCamera.isCalibrationTempSet() || i_rCamera.isCalibrationTimeSet();
   if (record.m_DetailsPresent)
-    HCameraConverter::convertOpticalCameraToVCameraCalibrationDetails(i_rCamera,
-                                                                      record.m_Details);
+    HCameraConverter::convertOpticalCameraToVCameraCalibrationDetails(i_rCamera, record.m_Details);
   HCameraConverter::convertOpticalCameraToVCameraMask(i_rCamera, record.m_Mask);
   record.m_UserId = i_rCamera.getCameraNumber() - 1;
   record.m_IsDV = i_rCamera.isDV();
@@ -47,6 +48,7 @@ bool XCPExporter::write() {
   const HVolumeProperties& volume = g_db->getCalibrationMgr()->getVolumeProperties();
   writer.setFloorExtents(volume.m_FloorMinX, volume.m_FloorMaxX, volume.m_FloorMinYZ,
                          volume.m_FloorMaxYZ);
-  for (const auto& [number, pCamera] : cameras) writer.addCamera(recordOf(*pCamera), 0);
+  for (const auto& [number, pCamera] : cameras)
+    writer.addCamera(recordOf(*pCamera), 0);
   return writer.save(m_filePath.GetString());
 }

@@ -15,13 +15,15 @@ void appendNumber(std::string& io_rText, double i_value) {
 
 std::string Numbers(std::initializer_list<double> i_values) {
   std::string text;
-  for (double value : i_values) appendNumber(text, value);
+  for (double value : i_values)
+    appendNumber(text, value);
   return text;
 }
 
 std::string Numbers(const std::vector<double>& i_rValues) {
   std::string text;
-  for (double value : i_rValues) appendNumber(text, value);
+  for (double value : i_rValues)
+    appendNumber(text, value);
   return text;
 }
 

@@ -37,7 +37,9 @@ std::string orderName(const HString& i_rName) {
 }
 } // namespace
 
-CsmExporter* CsmExporter::createInstance() { return new CsmExporter(); }
+CsmExporter* CsmExporter::createInstance() {
+  return new CsmExporter();
+}
 
 CsmExporter::CsmExporter() : FileExporter(false, "csm", false) {}
 
@@ -57,9 +59,12 @@ bool CsmExporter::recognize(const HString& i_rFilename) {
 
 HString CsmExporter::getDesiredUpAxisAsString() const {
   switch (m_options.m_desiredUpAxis) {
-  case EUpAxisY: return "Y";
-  case EUpAxisZ: return "Z";
-  default: return HString();
+  case EUpAxisY:
+    return "Y";
+  case EUpAxisZ:
+    return "Z";
+  default:
+    return HString();
   }
 }
 
@@ -76,9 +81,8 @@ bool CsmExporter::setDesiredUpAxis(HString i_axis) {
 }
 
 void CsmExporter::loadUserSetup() {
-  setDesiredUpAxis(g_interface.getUserSetupString(kSection, "DesiredUpAxis",
-                                                  getDesiredUpAxisAsString(),
-                                                  HString::EMPTY_STRING));
+  setDesiredUpAxis(g_interface.getUserSetupString(
+      kSection, "DesiredUpAxis", getDesiredUpAxisAsString(), HString::EMPTY_STRING));
 }
 
 void CsmExporter::saveUserSetup() const {

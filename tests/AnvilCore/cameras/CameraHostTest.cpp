@@ -86,11 +86,11 @@ TEST(CameraHost, DemoCamerasLookAtTheVolumeCentre) {
   for (int i = 0; i < count; ++i) {
     const OpticalCamera* pCamera = g_db->getOpticalCamera(i);
     uncalibrated += !pCamera->isCalibrated();
-    threeParameter += pCamera->isCalibrated() && pCamera->getDistortion().m_Model ==
-                                                     ECameraDistortionModel::Ostra3Parameter;
+    threeParameter += pCamera->isCalibrated() &&
+                      pCamera->getDistortion().m_Model == ECameraDistortionModel::Ostra3Parameter;
     const Vec3 toCentre = Vec3(0.0, 0.0, 1000.0) - pCamera->getConstWSPos();
-    const double distance = std::sqrt(toCentre.x * toCentre.x + toCentre.y * toCentre.y +
-                                      toCentre.z * toCentre.z);
+    const double distance =
+        std::sqrt(toCentre.x * toCentre.x + toCentre.y * toCentre.y + toCentre.z * toCentre.z);
     const Vec3 view = pCamera->getConstWSRot().rotate(Vec3(0.0, 0.0, -1.0));
     EXPECT_NEAR(view.x, toCentre.x / distance, 1e-9) << pCamera->getName().GetStr();
     EXPECT_NEAR(view.y, toCentre.y / distance, 1e-9);

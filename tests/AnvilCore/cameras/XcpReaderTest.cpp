@@ -77,8 +77,9 @@ TEST_F(XcpReaderTest, MalformedDocumentsNameTheFaultAndChangeNothing) {
   expectError("VERSION=\"2.0\"", "VERSION=\"3.0\"", "attribute VERSION: unsupported version");
   expectError("UP_AXIS=\"Y\"", "UP_AXIS=\"X\"", "attribute UP_AXIS");
   expectError("-10 10 -20 20", "-10 10 -20", "attribute FLOOR_EXTENTS: expected 4 numbers");
-  expectError("POSITION=\"1 2 3\"", "", "Camera 1 (NAME \"A\"), element KeyFrame, attribute "
-                                         "POSITION: missing");
+  expectError("POSITION=\"1 2 3\"", "",
+              "Camera 1 (NAME \"A\"), element KeyFrame, attribute "
+              "POSITION: missing");
   expectError("FOCAL_LENGTH=\"800\"", "FOCAL_LENGTH=\"8o0\"", "attribute FOCAL_LENGTH");
   expectError("ORIENTATION=\"0 0 0 1\"", "ORIENTATION=\"0 0 0 0\"", "quaternion is zero");
   expectError("Ostra3Parameter", "Ostra9Parameter", "unknown distortion model");
@@ -95,8 +96,9 @@ TEST_F(XcpReaderTest, TimesAreReadAsLocalTimeWithTheirDaylightFlag) {
   setenv("TZ", "CET-1CEST,M3.5.0,M10.5.0/3", 1);
   tzset();
   std::string text = kDocument;
-  text.replace(text.find("START_TEMP=\"20\""), 15,
-               "START_TIME=\"2023-07-01 14:00:00.000 DST\" END_TIME=\"2024-01-01 13:00:00.999 ST\"");
+  text.replace(
+      text.find("START_TEMP=\"20\""), 15,
+      "START_TIME=\"2023-07-01 14:00:00.000 DST\" END_TIME=\"2024-01-01 13:00:00.999 ST\"");
   std::string error;
   ASSERT_TRUE(AnvilCore::readXcpDocument(text, "cams.xcp", error)) << error;
   const VCameraCalibrationDetail& detail = g_db->getOpticalCamera(0)->getCalibrationDetail();

@@ -27,8 +27,10 @@ public:
     tzset();
   }
   ~TimeZone() {
-    if (m_old.empty()) unsetenv("TZ");
-    else setenv("TZ", m_old.c_str(), 1);
+    if (m_old.empty())
+      unsetenv("TZ");
+    else
+      setenv("TZ", m_old.c_str(), 1);
     tzset();
   }
 

@@ -70,11 +70,13 @@ TEST(XcpRoundTrip, RotationVectorsComeBackToTheSameQuaternion) {
     std::array<double, 3> v{component(generator), component(generator), component(generator)};
     const double n = std::sqrt(v[0] * v[0] + v[1] * v[1] + v[2] * v[2]);
     const double a = i % 10 == 0 ? 1e-9 * angle(generator) : angle(generator);
-    for (double& c : v) c *= a / n;
+    for (double& c : v)
+      c *= a / n;
     const std::array<double, 4> q = CoreOstraTypes::CameraOrientationQuaternion(v);
     const std::array<double, 3> back = AnvilCore::rotationVectorOfQuaternion(q);
     if (CoreOstraTypes::CameraOrientationQuaternion(back) == q) ++exact;
-    for (int k = 0; k < 3; ++k) EXPECT_NEAR(back[k], v[k], 1e-12);
+    for (int k = 0; k < 3; ++k)
+      EXPECT_NEAR(back[k], v[k], 1e-12);
   }
   EXPECT_EQ(exact, count);
 }

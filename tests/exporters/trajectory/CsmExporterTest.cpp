@@ -19,7 +19,8 @@ struct ExporterDeleter {
 std::vector<std::string> lines(const std::string& i_rText) {
   std::vector<std::string> result;
   std::istringstream in(i_rText);
-  for (std::string line; std::getline(in, line);) result.push_back(line);
+  for (std::string line; std::getline(in, line);)
+    result.push_back(line);
   return result;
 }
 
@@ -71,12 +72,22 @@ TEST_F(CsmExporterTest, WritesHeaderOrderAndPointsOfThePlayRange) {
   EXPECT_EQ(text[2], "$Time 12:00:00");
   // Only a backslash separates: a path with slashes is written whole.
   EXPECT_EQ(text[3], "$Filename " + ExportTest::tempPath("take.csm"));
-  const std::vector<std::string> expected = {
-      "$Actor Bob", "", "$Comments", "Motion capture produced by Harrow", "",
-      "$FirstFrame 2", "$LastFrame 4", "$Rate 100.000000", "", "$Order", "A_B C_D ", "",
-      "$Points", "2  2.500 20.000 200.000  2.250 20.000 200.000",
-      "3  3.500 30.000 300.000  3.250 30.000 300.000",
-      "4  4.500 40.000 400.000  4.250 40.000 400.000"};
+  const std::vector<std::string> expected = {"$Actor Bob",
+                                             "",
+                                             "$Comments",
+                                             "Motion capture produced by Harrow",
+                                             "",
+                                             "$FirstFrame 2",
+                                             "$LastFrame 4",
+                                             "$Rate 100.000000",
+                                             "",
+                                             "$Order",
+                                             "A_B C_D ",
+                                             "",
+                                             "$Points",
+                                             "2  2.500 20.000 200.000  2.250 20.000 200.000",
+                                             "3  3.500 30.000 300.000  3.250 30.000 300.000",
+                                             "4  4.500 40.000 400.000  4.250 40.000 400.000"};
   EXPECT_EQ(std::vector<std::string>(text.begin() + 4, text.end()), expected);
 }
 
