@@ -1,5 +1,7 @@
 #include "SceneSummary.h"
+#include "plugin/host/AudioSource.h"
 #include "plugin/host/Character.h"
+#include "plugin/host/NLEClip.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/HTimeManager.h"
 #include "plugin/host/Marker.h"
@@ -69,6 +71,23 @@ void describeScene(std::ostream& o_rOut) {
     if (p->isKindOf(&VideoCamera::s_classVideoCamera)) video.push_back(p->getName().GetString());
   nameList(o_rOut, "optical cameras", optical);
   nameList(o_rOut, "video cameras", video);
+
+  std::vector<std::string> audio;
+  for (Module* p : g_db->getModules()) {
+    if (!p->isKindOf(&AudioSource::s_classAudioSource)) continue;
+    const AudioSource* pAudio = static_cast<const AudioSource*>(p);
+    audio.push_back("\"" + p->getName().GetString() + "\" (" +
+                    std::to_string(pAudio->getNumChannels()) + " ch, " +
+                    std::to_string(pAudio->getSampleRate()) + " Hz, " +
+                    std::to_string(pAudio->getNumSamples()) + " samples)");
+  }
+  nameList(o_rOut, "audio sources", audio);
+
+  std::vector<std::string> clips;
+  for (const NLEClip* pClip = g_db->getHeadClip(); pClip; pClip = pClip->getNext())
+    clips.push_back("\"" + pClip->getName().GetString() + "\" " + frames(pClip->getRange()) +
+                    (pClip == g_db->getActiveClip() ? " (active)" : ""));
+  nameList(o_rOut, "clips", clips);
 }
 
 } // namespace AnvilCore
