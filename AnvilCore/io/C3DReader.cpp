@@ -168,7 +168,7 @@ private:
         parameter.name = std::move(name);
         parameter.offset = record;
         parameter.processor = m_rOut.processor;
-        readParameterBody(parameter, id, cursor, end);
+        readParameterBody(parameter, cursor, end);
         m_groupIds.push_back(id);
         m_rOut.parameters.push_back(std::move(parameter));
       }
@@ -183,7 +183,7 @@ private:
     }
   }
 
-  void readParameterBody(C3DParameter& io_rParameter, int i_group, size_t i_cursor, size_t i_end) {
+  void readParameterBody(C3DParameter& io_rParameter, size_t i_cursor, size_t i_end) {
     const std::string what = "parameter " + io_rParameter.name;
     if (i_cursor + 2 > i_end) fail(what + " runs past the parameter section", io_rParameter.offset);
     io_rParameter.type = int8_t(m_pData[i_cursor]);
@@ -206,7 +206,6 @@ private:
       fail(what + " holds " + std::to_string(bytes) + " bytes of data past the parameter section",
            io_rParameter.offset);
     io_rParameter.data.assign(m_pData + i_cursor, m_pData + i_cursor + bytes);
-    (void)i_group;
   }
 
   // Counts, rates and frame range from the header and the parameters.
@@ -221,6 +220,12 @@ private:
     }
     readFrameRange();
     readScaleAndRate();
+    if (!framesFitClock(m_rOut.frameRate, m_rOut.firstFrame,
+                        int64_t(m_rOut.firstFrame) + m_rOut.frameCount))
+      fail("frames " + std::to_string(m_rOut.firstFrame) + " to " +
+               std::to_string(int64_t(m_rOut.firstFrame) + m_rOut.frameCount - 1) + " at " +
+               std::to_string(m_rOut.frameRate) + " Hz lie beyond the host's clock",
+           C3D::HeaderOffset::EFirstFrame);
     readLabels();
     readAnalogLayout();
   }

@@ -2,6 +2,9 @@
 #include "plugin/host/Character.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/Marker.h"
+#include <algorithm>
+#include <cmath>
+#include <cstdlib>
 #include <map>
 #include <set>
 
@@ -46,6 +49,13 @@ void splitTrajectoryLabel(const std::string& i_label, const std::vector<SubjectP
   }
   o_rSubject = i_label.substr(0, colon);
   o_rMarker = i_label.substr(colon + 1);
+}
+
+bool framesFitClock(double i_rate, int64_t i_firstFrame, int64_t i_lastFrame) {
+  if (!(i_rate > 0.0)) return false;
+  const double ticksPerFrame = std::max(1.0, std::round(double(kTicksPerSecond) / i_rate));
+  const double extent = double(std::max(std::llabs(i_firstFrame), std::llabs(i_lastFrame)) + 1);
+  return extent * ticksPerFrame < 1e18;
 }
 
 double millimetresPer(const std::string& i_unit) {

@@ -22,6 +22,10 @@ struct SubjectPrefix {
 void splitTrajectoryLabel(const std::string& i_label, const std::vector<SubjectPrefix>& i_prefixes,
                           std::string& o_rSubject, std::string& o_rMarker);
 
+/// Whether frames `i_firstFrame` to `i_lastFrame` at `i_rate` frames per second all have a time on
+/// the host's clock (signed 64-bit ticks, with a wide margin).
+bool framesFitClock(double i_rate, int64_t i_firstFrame, int64_t i_lastFrame);
+
 /// Multiplier from a unit name ("mm", "cm", "m", "in", any case) to millimetres; 0 when unknown.
 double millimetresPer(const std::string& i_unit);
 

@@ -1,4 +1,5 @@
 #include "TrcReader.h"
+#include "TrajectoryScene.h"
 #include <cerrno>
 #include <cmath>
 #include <cstdlib>
@@ -87,6 +88,13 @@ public:
       readFrame(splitTabs(line));
     }
     const int frames = int(m_rOut.frameNumbers.size());
+    if (frames > 0 &&
+        !framesFitClock(m_rOut.dataRate, m_rOut.frameNumbers.front(), m_rOut.frameNumbers.back())) {
+      m_lineNumber = 0;
+      fail("frames " + std::to_string(m_rOut.frameNumbers.front()) + " to " +
+           std::to_string(m_rOut.frameNumbers.back()) + " at DataRate " +
+           std::to_string(m_rOut.dataRate) + " lie beyond the host's clock");
+    }
     if (m_rOut.declaredFrames > 0 && frames < m_rOut.declaredFrames) {
       m_lineNumber = 0;
       fail("the file ends after " + std::to_string(frames) + " of " +

@@ -213,6 +213,14 @@ TEST(C3DReader, MalformedFilesGiveClearErrors) {
   C3DTestFile nanScale = good;
   nanScale.scale = std::nanf("");
   EXPECT_EQ(parseError(nanScale.build()).find("the point scale is"), 0u);
+  C3DTestFile huge = good;
+  huge.extras.push_back({1, "HUGE", 4, {255, 255, 255, 255}, {}});
+  EXPECT_NE(parseError(huge.build()).find("parameter HUGE declares absurd dimensions"),
+            std::string::npos);
+  C3DTestFile slow = good;
+  slow.rate = 1e-6f; // frames a million seconds apart
+  slow.firstFrame = 60000;
+  EXPECT_NE(parseError(slow.build()).find("lie beyond the host's clock"), std::string::npos);
   auto manyFrames = bytes;
   manyFrames[8] = 0xFF;
   manyFrames[9] = 0xFF; // last frame 65535 over 4 whole frames of data: read as 4

@@ -106,6 +106,8 @@ TEST(TrcReader, MalformedFilesNameTheLine) {
       {head + names + "x\t0\t1\t2\t3\n", "line 6, column 1: frame number \"x\" is not a whole "
                                          "number"},
       {head + names + "1\t0\t1\t2\t3\n", "the file ends after 1 of 2 frames (NumFrames)"},
+      {std::string(kHeader) + "0.0001\t0\t1\t0\tmm\n" + "Frame#\tTime\n\t\t\n900000000\t0\n",
+       "frames 900000000 to 900000000 at DataRate 0.000100 lie beyond the host's clock"},
       {head + "Frame#\tTime\tA\t\t\tB\n1\t0\t1\t2\t3\n",
        "line 5: expected the X/Y/Z column line, found a frame"},
   };
