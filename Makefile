@@ -19,9 +19,12 @@ configure: $(BUILD)/CMakeCache.txt
 build: setup configure
 	cmake --build $(BUILD) -j $(JOBS)
 
+# The demo export starts from default options every time: a fresh user setup file in out/.
 run: build
 	@mkdir -p out
-	$(BUILD)/bin/anvil export demo $(foreach e,$(shell $(BUILD)/bin/anvil formats --extensions),-o out/demo.$(e))
+	@rm -f out/usersetup.ini
+	$(BUILD)/bin/anvil export demo --user-setup out/usersetup.ini \
+	  $(foreach e,$(shell $(BUILD)/bin/anvil formats --extensions),-o out/demo.$(e))
 	@ls -l out
 
 test: build

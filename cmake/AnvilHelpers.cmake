@@ -16,5 +16,7 @@ function(anvil_test name)
     ANVIL_TEST_DATA="${PROJECT_SOURCE_DIR}/tests/data"
     ANVIL_BIN_DIR="${CMAKE_BINARY_DIR}/bin"
     ANVIL_LIB_DIR="${CMAKE_BINARY_DIR}/lib")
-  gtest_discover_tests(${name} DISCOVERY_MODE PRE_TEST WORKING_DIRECTORY ${CMAKE_BINARY_DIR})
+  # Tests never touch the developer's own user setup.
+  gtest_discover_tests(${name} DISCOVERY_MODE PRE_TEST WORKING_DIRECTORY ${CMAKE_BINARY_DIR}
+    PROPERTIES ENVIRONMENT "XDG_CONFIG_HOME=${CMAKE_BINARY_DIR}/test-config")
 endfunction()
