@@ -4,8 +4,8 @@ namespace ExportOptionsCommand {
 
 void declareOptions(Command& io_rCommand, std::initializer_list<OptionSpec> i_options) {
   io_rCommand.setCommandCategory("File Handling", "");
-  for (const OptionSpec& spec : i_options)
-    io_rCommand.addOption(CommandOption::createInstance(spec.m_pName, 1, spec.m_type, false), 0,
+  for (const OptionSpec& option : i_options)
+    io_rCommand.addOption(CommandOption::createInstance(option.m_pName, 1, option.m_type, false), 0,
                           false);
 }
 
