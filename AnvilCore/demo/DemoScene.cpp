@@ -3,7 +3,13 @@
 #include "plugin/host/Character.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/HTimeManager.h"
+#include "plugin/host/LabelingConstraint.h"
+#include "plugin/host/LabelingSetup.h"
 #include "plugin/host/Marker.h"
+#include "plugin/host/RetargetingSetup.h"
+#include "plugin/host/SolvingSetup.h"
+#include "plugin/host/SubjectBone.h"
+#include "AnvilCore/SubjectJointPose.h"
 #include <algorithm>
 #include <map>
 
@@ -30,6 +36,47 @@ bool inGap(const std::string& i_rName, int i_frame) {
   return std::any_of(std::begin(kGaps), std::end(kGaps), [&](const Gap& g) {
     return i_rName == g.marker && i_frame >= g.first && i_frame <= g.last;
   });
+}
+
+// Keys the joints of every setup's bones at each frame.
+void animateDemoWalker(Character& io_rWalker, int i_frames, int64_t i_ticksPerFrame) {
+  ParameterizedSetup* setups[] = {io_rWalker.getLabelingSetup(false),
+                                  io_rWalker.getSolvingSetup(false),
+                                  io_rWalker.getRetargetingSetup(false)};
+  std::vector<std::vector<double>> params;
+  for (ParameterizedSetup* pSetup : setups) {
+    std::vector<SubjectBone*> bones;
+    pSetup->collectBones(bones);
+    for (int frame = 0; frame < i_frames; ++frame) {
+      demoWalkJoints(frame / kRate, params);
+      for (size_t b = 0; b < bones.size(); ++b) {
+        SubjectBone& bone = *bones[b];
+        Vec3 translation;
+        AnvilRotation rotation;
+        jointToBoneMotion(bone.segmentRecord().m_Joint, bone.getPreRotation(), params[b],
+                          translation, rotation);
+        if (bone.getJointType() == CoreOstraTypes::VJointTypeBase::EFree)
+          bone.m_positionTrack.setKey(frame * i_ticksPerFrame, translation);
+        bone.m_rotationTrack.setKey(frame * i_ticksPerFrame, rotation);
+      }
+    }
+  }
+}
+
+// The labeling constraint of each marker name.
+std::vector<const Node*> constraintsByName(const LabelingSetup& i_rSetup,
+                                           const std::vector<std::string>& i_rNames) {
+  std::vector<SubjectBone*> bones;
+  i_rSetup.collectBones(bones);
+  std::vector<const Node*> result(i_rNames.size(), nullptr);
+  for (SubjectBone* pBone : bones)
+    for (int i = 0; i < pBone->getNumChildren(); ++i) {
+      const Module* pChild = pBone->getChild(i);
+      auto it = std::find(i_rNames.begin(), i_rNames.end(), pChild->getName().GetStr());
+      if (it != i_rNames.end() && pChild->isKindOf(&LabelingConstraint::s_classLabelingConstraint))
+        result[size_t(it - i_rNames.begin())] = static_cast<const Node*>(pChild);
+    }
+  return result;
 }
 } // namespace
 
@@ -58,12 +105,16 @@ void buildDemoScene() {
     g_db->addToScene(pMarker, false, pWalker, false, false);
     markers.push_back(pMarker);
   }
-  std::vector<Vec3> positions;
-  for (int frame = 0; frame < kFrames; ++frame) {
-    demoWalkPose(frame / kRate, positions);
+  // The walker's setups, their bones walking; the markers follow the labeling setup's
+  // constraints.
+  std::vector<std::string> errors;
+  addSubjectToScene(demoWalkRecords(), errors);
+  animateDemoWalker(*pWalker, kFrames, tpf);
+  std::vector<const Node*> places = constraintsByName(*pWalker->getLabelingSetup(false), names);
+  for (int frame = 0; frame < kFrames; ++frame)
     for (size_t m = 0; m < markers.size(); ++m)
-      if (!inGap(names[m], frame)) markers[m]->m_track.setKey(frame * tpf, positions[m]);
-  }
+      if (!inGap(names[m], frame))
+        markers[m]->m_track.setKey(frame * tpf, places[m]->getWSPos(frame * tpf));
 
   // Unlabelled trajectories: a stray reflection seen for a while, a ghost of the left hand that
   // flickers, and a marker left on the floor.
@@ -78,9 +129,9 @@ void buildDemoScene() {
     p = Vec3(2150.0, 1480.0, 2310.0);
     return true;
   });
+  const Marker* pHand = markers[size_t(demoWalkMarkerIndex("LFIN"))];
   addUnlabeled("Unlabeled2", 500, 800, [&](int frame, Vec3& p) {
-    demoWalkPose(frame / kRate, positions);
-    p = positions[demoWalkMarkerIndex("LFIN")] + Vec3(35.0, 20.0, -15.0);
+    p = pHand->m_track.evaluate(frame * tpf, Vec3()) + Vec3(35.0, 20.0, -15.0);
     return (frame / 7) % 3 != 0;
   });
   addUnlabeled("Unlabeled3", 0, kFrames - 1, [](int, Vec3& p) {

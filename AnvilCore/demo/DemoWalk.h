@@ -1,15 +1,19 @@
 #pragma once
-#include "plugin/host/Vec3.h"
+#include "AnvilCore/SubjectSetupBuilder.h"
 #include <string>
 #include <vector>
 
 namespace AnvilCore {
 
-/// Names of the demo walker's markers, in the order `demoWalkPose` fills them.
+/// Names of the demo walker's markers, in the order of its marker records.
 const std::vector<std::string>& demoWalkMarkerNames();
 /// Index of a marker name in that list, or -1.
 int demoWalkMarkerIndex(const std::string& i_rName);
-/// Marker positions (millimetres, Z up) of a person walking along +X at time `i_seconds`.
-void demoWalkPose(double i_seconds, std::vector<Vec3>& o_rPositions);
+/// The walker as subject records: 20 segments (a free pelvis; ball, hinge and Hardy-Spicer
+/// joints down the limbs), its markers, one point target per marker. Millimetres, Z up, facing +X.
+SubjectRecords demoWalkRecords();
+/// Joint parameters of every segment, in segment order, of a person walking along +X at time
+/// `i_seconds`: the pelvis travels with a vertical bob, legs and arms swing in opposition.
+void demoWalkJoints(double i_seconds, std::vector<std::vector<double>>& o_rParams);
 
 } // namespace AnvilCore

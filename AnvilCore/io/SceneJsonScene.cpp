@@ -1,6 +1,7 @@
 // Scene-wide sections of the scene file: identity, time settings, orientation and subjects.
 #include "SceneJson.h"
 #include "SceneJsonNodes.h"
+#include "SceneJsonSubjects.h"
 #include "plugin/host/Character.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/HTimeManager.h"
@@ -84,7 +85,8 @@ void readSubjects(const nlohmann::json& i_rValue, const std::string& i_path,
     const std::string path = i_path + "/" + std::to_string(i);
     const nlohmann::json& subject = i_rValue[i];
     onlyKeys(subject, path,
-             {"name", "prop", "selected", "visible", "markers", "nodes", ANVIL_SCENE_TRANSFORM_KEYS});
+             {"name", "prop", "selected", "visible", "markers", "nodes", ANVIL_SCENE_TRANSFORM_KEYS,
+              ANVIL_SCENE_SUBJECT_SETUP_KEYS});
     const std::string subjectName = name(member(subject, path, "name"), path + "/name");
     checkUniqueName(io_rContext.root.get(), subjectName, path + "/name");
     auto pCharacter = std::make_unique<Character>(HString(subjectName));
@@ -92,6 +94,7 @@ void readSubjects(const nlohmann::json& i_rValue, const std::string& i_path,
     if (auto* p = optional(subject, "selected")) pCharacter->setSelected(boolean(*p, path + "/selected"));
     if (auto* p = optional(subject, "visible")) pCharacter->setVisible(boolean(*p, path + "/visible"));
     readTransform(subject, path, io_rContext, *pCharacter);
+    readSubjectSetups(subject, path, io_rContext, *pCharacter);
     Character* pSubject = pCharacter.get();
     io_rContext.root->addChild(pCharacter.release());
     io_rContext.byName[subjectName] = pSubject;

@@ -12,6 +12,9 @@ class CalibrationMgr;
 class Character;
 class FileExporterMgr;
 class HTimeManager;
+class LabelingBone;
+class LabelingCluster;
+class LabelingConstraint;
 class Module;
 class NLEClip;
 class Node;
@@ -81,6 +84,14 @@ public:
   /// Every optical camera of the scene, in scene order; null for an index out of range.
   int getNumOpticalCameras() const;
   OpticalCamera* getOpticalCamera(int i_index) const;
+  /// Every labeling bone, constraint and cluster of the scene, in scene order; null for an index
+  /// out of range.
+  int getNumLabelingBones() const;
+  LabelingBone* getLabelingBone(int i_index) const;
+  int getNumLabelingConstraints() const;
+  LabelingConstraint* getLabelingConstraint(int i_index) const;
+  int getNumLabelingClusters() const;
+  LabelingCluster* getLabelingCluster(int i_index) const;
   /// Every module of the scene, parents before children.
   const std::vector<Module*>& getModules() const;
   TSimpleArray<Module*> getModulesWithName(const HString& i_rName,

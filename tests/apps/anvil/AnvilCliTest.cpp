@@ -109,7 +109,9 @@ TEST_F(AnvilCli, InfoFormatsAndHelp) {
   EXPECT_NE(run.output.find("frame rate: 120 Hz"), std::string::npos) << run.output;
   EXPECT_NE(run.output.find("labelled markers: 41"), std::string::npos);
   EXPECT_NE(run.output.find("unlabelled markers: 3"), std::string::npos);
-  EXPECT_NE(run.output.find("subjects: 1"), std::string::npos);
+  EXPECT_NE(run.output.find("subjects: 2"), std::string::npos); // the walker and the box prop
+  EXPECT_NE(run.output.find("audio sources: 1"), std::string::npos);
+  EXPECT_NE(run.output.find("clips: 1"), std::string::npos);
 
   run = anvil("formats");
   ASSERT_EQ(run.code, 0) << run.output;
