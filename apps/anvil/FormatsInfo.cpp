@@ -1,5 +1,6 @@
 #include "ModuleLoader.h"
 #include "Subcommands.h"
+#include "SubjectSummary.h"
 #include "AnvilCore/SceneSummary.h"
 #include "AnvilCore/io/SceneInputs.h"
 #include "plugin/host/Database.h"
@@ -33,13 +34,24 @@ int runFormats(const CommonArgs& i_rCommon, bool i_extensionsOnly) {
 }
 
 int runInfo(const CommonArgs&, const std::vector<std::string>& i_inputs) {
+  // Subject files are summarised on their own; the other inputs make the scene.
+  std::vector<std::string> sceneInputs;
+  int subjectExit = EExitOk;
+  for (const auto& input : i_inputs) {
+    if (!isSubjectFile(input)) {
+      sceneInputs.push_back(input);
+    } else if (runSubjectInfo(input, std::cout) != EExitOk) {
+      subjectExit = EExitWriteFailed;
+    }
+  }
+  if (sceneInputs.empty()) return subjectExit;
   std::string error;
-  if (!AnvilCore::loadSceneInputs(i_inputs, error)) {
+  if (!AnvilCore::loadSceneInputs(sceneInputs, error)) {
     printError(error);
     return EExitUsage;
   }
   AnvilCore::describeScene(std::cout);
-  return EExitOk;
+  return subjectExit;
 }
 
 } // namespace anvil

@@ -1,5 +1,6 @@
 // anvil: loads the export module, reads scenes and exports them.
 #include "CommandOptions.h"
+#include "SchemaCommand.h"
 #include "Subcommands.h"
 #include <CLI/CLI.hpp>
 #include <iostream>
@@ -36,7 +37,12 @@ int main(int argc, char** argv) {
 
   std::vector<std::string> infoInputs;
   CLI::App* pInfo = app.add_subcommand("info", "Summarise a scene");
-  pInfo->add_option("inputs", infoInputs, "'demo' or scene files")->required();
+  pInfo->add_option("inputs", infoInputs, "'demo', scene files or subject files (.kmt .kmf .kms .kmr)")->required();
+
+  std::string schemaLanguage, schemaOutput;
+  CLI::App* pSchema = app.add_subcommand("schema", "Write the XSD of a file language");
+  pSchema->add_option("language", schemaLanguage, "'kmt'")->required();
+  pSchema->add_option("-o,--output", schemaOutput, "Output file")->required();
 
   CLI::App* pCommands = app.add_subcommand("commands", "List the option commands and their options");
   pCommands->add_option("--module", common.modulePath, "Path of libAnvilFileExport.so");
@@ -54,5 +60,6 @@ int main(int argc, char** argv) {
   if (pFormats->parsed()) return runFormats(common, extensionsOnly);
   if (pInfo->parsed()) return runInfo(common, infoInputs);
   if (pCommands->parsed()) return runCommandsListing(common.modulePath);
+  if (pSchema->parsed()) return runSchema(schemaLanguage, schemaOutput);
   return EExitUsage;
 }
