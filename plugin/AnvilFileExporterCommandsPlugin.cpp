@@ -1,5 +1,9 @@
 #include "AnvilFileExporterCommandsPlugin.h"
 #include "commands/C3dExportOptionsCmd.h"
+#include "commands/KmfExportOptionsCmd.h"
+#include "commands/KmrExportOptionsCmd.h"
+#include "commands/KmsExportOptionsCmd.h"
+#include "commands/KmtExportOptionsCmd.h"
 #include "commands/TrcExportOptionsCmd.h"
 #include <new>
 
@@ -12,5 +16,9 @@ bool AnvilFileExporterCommandsPlugin::loadCommands() {
   m_commands.add(new (std::nothrow) C3dExportOptionsCmd());
 
   m_commands.add(new (std::nothrow) TrcExportOptionsCmd());
+  m_commands.add(new (std::nothrow) KmtExportOptionsCmd());
+  m_commands.add(new (std::nothrow) KmfExportOptionsCmd());
+  m_commands.add(new (std::nothrow) KmsExportOptionsCmd());
+  m_commands.add(new (std::nothrow) KmrExportOptionsCmd());
   return true;
 }

@@ -1,5 +1,9 @@
 #include "AnvilFileExportersPlugin.h"
 #include "exporters/camera/XCPExporter.h"
+#include "exporters/subject/KmfExporter.h"
+#include "exporters/subject/KmrExporter.h"
+#include "exporters/subject/KmsExporter.h"
+#include "exporters/subject/KmtExporter.h"
 #include "exporters/trajectory/C3DExporter.h"
 #include "exporters/trajectory/CsmExporter.h"
 #include "exporters/trajectory/TrcExporter.h"
@@ -13,6 +17,10 @@ bool AnvilFileExportersPlugin::loadExporters() {
   m_exporters.add(C3DExporter::createInstance());
   m_exporters.add(CsmExporter::createInstance());
   m_exporters.add(TrcExporter::createInstance());
+  m_exporters.add(KmfExporter::createInstance());
+  m_exporters.add(KmtExporter::createInstance());
+  m_exporters.add(KmsExporter::createInstance());
+  m_exporters.add(KmrExporter::createInstance());
   m_exporters.add(XCPExporter::createInstance());
   return true;
 }
