@@ -2,6 +2,7 @@
 // integer form, against writing the same number of bytes with one plain fwrite per frame. The
 // ratios of each export to its floor are printed after the table.
 #include "AnvilCore/ExportDriver.h"
+#include "LongTake.h"
 #include "exporters/trajectory/C3DExporter.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/HTimeManager.h"
@@ -17,35 +18,11 @@
 #include <vector>
 
 namespace {
-constexpr int kMarkers = 200;
-constexpr int kFrames = 36000;
+using namespace Bench;
 
-void buildScene() {
-  static bool s_built = false;
-  if (s_built) return;
-  s_built = true;
-  g_db->clearScene();
-  HTimeManager* pTime = g_db->getTimeManager();
-  pTime->setFrameRate(120.0);
-  const int64_t tpf = pTime->getTicksPerFrame();
-  pTime->setAnimRange(HTimeRange(0, (kFrames - 1) * tpf));
-  for (int m = 0; m < kMarkers; ++m) {
-    auto* pMarker = new Marker(HString("Subject:M" + std::to_string(m)));
-    pMarker->m_track.reserve(kFrames);
-    for (int f = 0; f < kFrames; ++f)
-      if ((f + 37 * m) % 500 > 3) // a short gap now and then
-        pMarker->m_track.setKey(f * tpf, Vec3(1000.0 * std::sin(f * 0.01 + m), 500.0 + m,
-                                              1200.0 * std::cos(f * 0.013 - m)));
-    g_db->addToScene(pMarker, false, nullptr, false, false);
-  }
-  g_theOperationStack.setStream(nullptr, false);
-}
+void buildScene() { longTake({"Subject:M", nullptr, true}); }
 
-std::string outputPath(const char* i_pSuffix) {
-  return (std::filesystem::temp_directory_path() /
-          ("anvil-bench-" + std::to_string(::getpid()) + i_pSuffix))
-      .string();
-}
+std::string outputPath(const char* i_pSuffix) { return tempOutput(i_pSuffix); }
 
 // File size of each form's export, for its floor.
 std::map<bool, uintmax_t>& exportedBytes() {

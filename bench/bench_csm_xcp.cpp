@@ -1,5 +1,6 @@
 // CSM export of 200 markers over 36,000 frames (five minutes at 120 Hz), against the floor of
 // formatting the same numbers with snprintf into memory. Compare the two times of one run.
+#include "LongTake.h"
 #include "exporters/trajectory/CsmExporter.h"
 #include "plugin/host/Character.h"
 #include "plugin/host/Database.h"
@@ -12,33 +13,10 @@
 
 namespace {
 
-constexpr int kMarkers = 200;
-constexpr int kFrames = 36000;
+using Bench::kFrames;
+using Bench::kMarkers;
 
-std::vector<Marker*>& buildScene() {
-  static std::vector<Marker*> s_markers;
-  if (!s_markers.empty()) return s_markers;
-  g_db->clearScene();
-  HTimeManager* pTime = g_db->getTimeManager();
-  pTime->setFrameRate(120.0);
-  const int64_t tpf = pTime->getTicksPerFrame();
-  pTime->setAnimRange(HTimeRange(0, (kFrames - 1) * tpf));
-  pTime->setPlayRange(HTimeRange(0, (kFrames - 1) * tpf));
-  auto* pSubject = new Character("Bench");
-  g_db->addToScene(pSubject, false, nullptr, false, false);
-  for (int m = 0; m < kMarkers; ++m) {
-    auto* pMarker = new Marker(HString("M" + std::to_string(m)));
-    pMarker->m_track.reserve(kFrames);
-    for (int f = 0; f < kFrames; ++f) {
-      const double t = f / 120.0;
-      pMarker->m_track.setKey(f * tpf, Vec3(1000.0 * std::sin(t + m), 800.0 * std::cos(0.7 * t + m),
-                                            900.0 + 0.5 * m + 100.0 * std::sin(2.0 * t)));
-    }
-    g_db->addToScene(pMarker, false, pSubject, false, false);
-    s_markers.push_back(pMarker);
-  }
-  return s_markers;
-}
+std::vector<Marker*>& buildScene() { return Bench::longTake({"M", "Bench", false}); }
 
 // A stream that counts and discards what is written to it.
 FILE* countingStream(long long* o_pCount) {

@@ -1,6 +1,7 @@
 // TRC export of a long take: 200 markers x 36,000 frames (five minutes at 120 Hz), against the
 // floor of formatting the same numbers with snprintf into memory.
 #include "AnvilCore/ExportDriver.h"
+#include "LongTake.h"
 #include "exporters/trajectory/TrcExporter.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/HTimeManager.h"
@@ -14,40 +15,13 @@
 #include <unistd.h>
 
 namespace {
-constexpr int kMarkers = 200;
-constexpr int kFrames = 36000;
-
-void buildScene() {
-  static bool s_built = false;
-  if (s_built) return;
-  s_built = true;
-  g_db->clearScene();
-  HTimeManager* pTime = g_db->getTimeManager();
-  pTime->setFrameRate(120.0);
-  const int64_t tpf = pTime->getTicksPerFrame();
-  pTime->setAnimRange(HTimeRange(0, (kFrames - 1) * tpf));
-  for (int m = 0; m < kMarkers; ++m) {
-    auto* pMarker = new Marker(HString("M" + std::to_string(m)));
-    pMarker->m_track.reserve(kFrames);
-    for (int f = 0; f < kFrames; ++f)
-      pMarker->m_track.setKey(f * tpf, Vec3(1000.0 * std::sin(f * 0.01 + m), 500.0 + m,
-                                            1200.0 * std::cos(f * 0.013 - m)));
-    g_db->addToScene(pMarker, false, nullptr, false, false);
-  }
-  g_theOperationStack.setStream(nullptr, false);
-}
-
-std::string outputPath() {
-  return (std::filesystem::temp_directory_path() /
-          ("anvil-bench-" + std::to_string(::getpid()) + ".trc"))
-      .string();
-}
+using namespace Bench;
 
 void BM_TrcExport(benchmark::State& state) {
-  buildScene();
+  longTake();
   TrcExporter* pExporter = TrcExporter::createInstance();
   AnvilCore::ExportRequest request;
-  request.path = outputPath();
+  request.path = tempOutput(".trc");
   std::string error;
   for (auto _ : state) {
     if (AnvilCore::runExport(*pExporter, request, error) != AnvilCore::EExportStatus::EOk)
@@ -63,9 +37,7 @@ void BM_TrcExport(benchmark::State& state) {
 
 // The same numbers formatted with plain snprintf into one memory buffer: the cost of the text.
 void BM_SnprintfFloor(benchmark::State& state) {
-  buildScene();
-  std::vector<const Marker*> markers;
-  for (int i = 0; i < g_db->getNumNodes(); ++i) markers.push_back(static_cast<Marker*>(g_db->getNode(i)));
+  const std::vector<Marker*>& markers = longTake();
   std::string buffer;
   for (auto _ : state) {
     buffer.clear();
