@@ -16,8 +16,8 @@ AnvilRotation axisRotation(int i_axis, double i_degrees) {
 } // namespace
 
 AnvilRotation::AnvilRotation(const Vec3& i_rAxis, double i_degrees) {
-  const double length = std::sqrt(i_rAxis.x * i_rAxis.x + i_rAxis.y * i_rAxis.y +
-                                  i_rAxis.z * i_rAxis.z);
+  const double length =
+      std::sqrt(i_rAxis.x * i_rAxis.x + i_rAxis.y * i_rAxis.y + i_rAxis.z * i_rAxis.z);
   if (length == 0.0) return;
   const double half = 0.5 * i_degrees * kDegToRad;
   const double s = std::sin(half) / length;
@@ -41,7 +41,9 @@ AnvilRotation::AnvilRotation(double i_x, double i_y, double i_z, double i_w, boo
   m_w /= n;
 }
 
-AnvilRotation AnvilRotation::inverse() const { return AnvilRotation(-m_x, -m_y, -m_z, m_w, false); }
+AnvilRotation AnvilRotation::inverse() const {
+  return AnvilRotation(-m_x, -m_y, -m_z, m_w, false);
+}
 
 void AnvilRotation::getAsQuaternion(double& o_rX, double& o_rY, double& o_rZ, double& o_rW) const {
   o_rX = m_x;

@@ -42,12 +42,22 @@ Database::Database()
       m_pSubjectManager(std::make_unique<SubjectManager>()),
       m_pCalibrationMgr(std::make_unique<CalibrationMgr>()), m_logSink(defaultSink) {}
 
-Database::~Database() { clearClips(); }
+Database::~Database() {
+  clearClips();
+}
 
-FileExporterMgr* Database::getFileExporterMgr() { return m_pExporterMgr.get(); }
-HTimeManager* Database::getTimeManager() { return m_pTimeManager.get(); }
-SubjectManager* Database::getSubjectManager() { return m_pSubjectManager.get(); }
-CalibrationMgr* Database::getCalibrationMgr() { return m_pCalibrationMgr.get(); }
+FileExporterMgr* Database::getFileExporterMgr() {
+  return m_pExporterMgr.get();
+}
+HTimeManager* Database::getTimeManager() {
+  return m_pTimeManager.get();
+}
+SubjectManager* Database::getSubjectManager() {
+  return m_pSubjectManager.get();
+}
+CalibrationMgr* Database::getCalibrationMgr() {
+  return m_pCalibrationMgr.get();
+}
 
 HString Database::getScratchPath() const {
   std::error_code ec;
@@ -115,7 +125,8 @@ void Database::rebuildCache() const {
   m_modules.clear();
   m_nodes.clear();
   m_opticalCameras.clear();
-  for (int i = 0; i < m_pRoot->getNumChildren(); ++i) m_pRoot->getChild(i)->collect(m_modules);
+  for (int i = 0; i < m_pRoot->getNumChildren(); ++i)
+    m_pRoot->getChild(i)->collect(m_modules);
   for (Module* p : m_modules) {
     if (p->isKindOf(&Node::s_classNode)) m_nodes.push_back(static_cast<Node*>(p));
     if (p->isKindOf(&OpticalCamera::s_classOpticalCamera))
@@ -163,13 +174,19 @@ void Database::log(HLogLevel i_level, const std::string& i_rText) {
   if (m_logSink) m_logSink(i_level, i_rText);
 }
 
-#define ANVIL_LOG_BODY(level)                                                                     \
+#define ANVIL_LOG_BODY(level)                                                                      \
   va_list args;                                                                                    \
   va_start(args, i_pFormat);                                                                       \
   const std::string text = vformat(i_pFormat, args);                                               \
   va_end(args);                                                                                    \
   log(level, text);
 
-void Database::logInfo(const char* i_pFormat, ...) { ANVIL_LOG_BODY(HLogLevel::EInfo) }
-void Database::logWarning(const char* i_pFormat, ...) { ANVIL_LOG_BODY(HLogLevel::EWarning) }
-void Database::logError(const char* i_pFormat, ...) { ANVIL_LOG_BODY(HLogLevel::EError) }
+void Database::logInfo(const char* i_pFormat, ...) {
+  ANVIL_LOG_BODY(HLogLevel::EInfo)
+}
+void Database::logWarning(const char* i_pFormat, ...) {
+  ANVIL_LOG_BODY(HLogLevel::EWarning)
+}
+void Database::logError(const char* i_pFormat, ...) {
+  ANVIL_LOG_BODY(HLogLevel::EError)
+}

@@ -35,8 +35,8 @@ bool selectedOrUnderSelection(const Module* i_pModule) {
 
 std::string temporarySibling(const std::string& i_path) {
   const std::filesystem::path path(i_path);
-  return (path.parent_path() / ("." + path.filename().string() + ".anvil-" +
-                                std::to_string(::getpid()) + ".tmp"))
+  return (path.parent_path() /
+          ("." + path.filename().string() + ".anvil-" + std::to_string(::getpid()) + ".tmp"))
       .string();
 }
 } // namespace

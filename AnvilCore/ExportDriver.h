@@ -18,9 +18,9 @@ enum class EExportStatus {
 };
 
 struct ExportRequest {
-  std::string path;                     ///< output file as the user gave it
-  std::optional<HTimeRange> range;      ///< default: the animation range
-  bool selectedOnly = false;            ///< export only selected modules
+  std::string path;                ///< output file as the user gave it
+  std::optional<HTimeRange> range; ///< default: the animation range
+  bool selectedOnly = false;       ///< export only selected modules
 };
 
 /// Runs one export the way the host does: open the stream, fill the module list and range,

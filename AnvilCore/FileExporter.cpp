@@ -17,8 +17,12 @@ void FileExporter::getCompatibleFrameRates(std::vector<double>& o_rRates) {
 }
 
 // Any rate is compatible unless an exporter says otherwise.
-uint64_t FileExporter::getNumCompatibleFrameRates() { return 0; }
-double FileExporter::getCompatibleFrameRate(uint64_t) { return 0.0; }
+uint64_t FileExporter::getNumCompatibleFrameRates() {
+  return 0;
+}
+double FileExporter::getCompatibleFrameRate(uint64_t) {
+  return 0.0;
+}
 
 FILE* FileExporter::openFile(const HString& i_rPath, bool i_binary) {
   return std::fopen(i_rPath.GetStr(), i_binary ? "wb" : "w");
@@ -41,7 +45,9 @@ bool FileExporter::isInModsList(const Module* i_pModule) const {
   return false;
 }
 
-FileExporterMgr::~FileExporterMgr() { clear(); }
+FileExporterMgr::~FileExporterMgr() {
+  clear();
+}
 
 void FileExporterMgr::registerExporter(FileExporter* i_pExporter) {
   if (i_pExporter) m_exporters.push_back(i_pExporter);
@@ -62,6 +68,7 @@ FileExporter* FileExporterMgr::findForFile(const HString& i_rPath) const {
 }
 
 void FileExporterMgr::clear() {
-  for (FileExporter* p : m_exporters) p->deleteThis();
+  for (FileExporter* p : m_exporters)
+    p->deleteThis();
   m_exporters.clear();
 }

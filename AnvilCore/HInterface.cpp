@@ -84,8 +84,8 @@ void HInterface::setUserSetupBool(const HString& i_section, const HString& i_key
   set(i_section, i_key, i_value ? "true" : "false");
 }
 
-void HInterface::setUserSetupDouble(const HString& i_section, const HString& i_key,
-                                    double i_value, const HString&) {
+void HInterface::setUserSetupDouble(const HString& i_section, const HString& i_key, double i_value,
+                                    const HString&) {
   char text[64];
   std::snprintf(text, sizeof text, "%.17g", i_value);
   set(i_section, i_key, text);
@@ -140,7 +140,8 @@ bool HInterface::save(std::string& o_rError) const {
     std::ofstream out(temp, std::ios::trunc);
     for (const auto& [section, keys] : m_values) {
       out << '[' << section << "]\n";
-      for (const auto& [key, value] : keys) out << key << '=' << value << '\n';
+      for (const auto& [key, value] : keys)
+        out << key << '=' << value << '\n';
       out << '\n';
     }
     if (!out.flush()) {

@@ -15,9 +15,13 @@ int HTimeRange::getNumFrames() const {
   return static_cast<int>((m_end - m_start) / tpf + 1);
 }
 
-HTimeManager* HTimeManager::getInstance() { return g_db->getTimeManager(); }
+HTimeManager* HTimeManager::getInstance() {
+  return g_db->getTimeManager();
+}
 
-HTimeManager::HTimeManager() { setFrameRate(120.0); }
+HTimeManager::HTimeManager() {
+  setFrameRate(120.0);
+}
 
 void HTimeManager::setFrameRate(double i_framesPerSecond) {
   if (!(i_framesPerSecond > 0.0) || !std::isfinite(i_framesPerSecond)) return;

@@ -5,7 +5,8 @@
 Module::Module(const HString& i_rName) : m_name(i_rName) {}
 
 Module::~Module() {
-  for (Module* pChild : m_children) delete pChild;
+  for (Module* pChild : m_children)
+    delete pChild;
 }
 
 Character* Module::getCharacterParent() const {
@@ -18,7 +19,8 @@ namespace {
 // The scene's root has no parent and no name of its own in paths.
 HString pathOf(const Module* i_pModule) {
   std::vector<const Module*> chain;
-  for (const Module* p = i_pModule; p && p->hasParent(); p = p->getParent()) chain.push_back(p);
+  for (const Module* p = i_pModule; p && p->hasParent(); p = p->getParent())
+    chain.push_back(p);
   HString path;
   for (auto it = chain.rbegin(); it != chain.rend(); ++it) {
     if (!path.IsEmpty()) path += "\\";
@@ -28,9 +30,13 @@ HString pathOf(const Module* i_pModule) {
 }
 } // namespace
 
-HString Module::getPartialPathString() const { return pathOf(this); }
+HString Module::getPartialPathString() const {
+  return pathOf(this);
+}
 
-HString Module::getFullPathString() const { return HString("\\") + pathOf(this); }
+HString Module::getFullPathString() const {
+  return HString("\\") + pathOf(this);
+}
 
 bool Module::isDescendedFrom(const Module* i_pAncestor) const {
   for (const Module* p = m_pParent; p; p = p->m_pParent)
@@ -39,9 +45,8 @@ bool Module::isDescendedFrom(const Module* i_pAncestor) const {
 }
 
 int Module::getNumNodeChildren() const {
-  return static_cast<int>(std::count_if(m_children.begin(), m_children.end(), [](Module* p) {
-    return p->isKindOf(&Node::s_classNode);
-  }));
+  return static_cast<int>(std::count_if(m_children.begin(), m_children.end(),
+                                        [](Module* p) { return p->isKindOf(&Node::s_classNode); }));
 }
 
 Node* Module::getNodeChild(int i_index) const {
@@ -79,7 +84,8 @@ Module* Module::detachChild(Module* i_pChild) {
 
 void Module::collect(std::vector<Module*>& o_rModules) {
   o_rModules.push_back(this);
-  for (Module* p : m_children) p->collect(o_rModules);
+  for (Module* p : m_children)
+    p->collect(o_rModules);
 }
 
 HString ModulePath::getPartialPathString() const {

@@ -1,7 +1,7 @@
+#include "SceneRotation.h"
 #include "plugin/host/Character.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/Marker.h"
-#include "SceneRotation.h"
 
 Node::Node(const HString& i_rName) : Module(i_rName) {}
 
@@ -16,11 +16,15 @@ bool Node::isAnimated() const {
   return !m_positionTrack.isEmpty() || !m_rotationTrack.isEmpty() || !m_scaleTrack.isEmpty();
 }
 
-Vec3 Node::getLocalPos(HTime i_t) const { return m_positionTrack.evaluate(i_t, m_staticPos); }
+Vec3 Node::getLocalPos(HTime i_t) const {
+  return m_positionTrack.evaluate(i_t, m_staticPos);
+}
 AnvilRotation Node::getLocalRot(HTime i_t) const {
   return m_rotationTrack.evaluate(i_t, m_staticRot);
 }
-Vec3 Node::getLocalScale(HTime i_t) const { return m_scaleTrack.evaluate(i_t, m_staticScale); }
+Vec3 Node::getLocalScale(HTime i_t) const {
+  return m_scaleTrack.evaluate(i_t, m_staticScale);
+}
 
 void Node::getConstLocalTransform(Vec3& o_rTranslation, AnvilRotation& o_rRotation,
                                   Vec3& o_rScale) const {

@@ -44,7 +44,8 @@ void OperationStack::draw(bool) {
   m_drawnPercent = percent;
   constexpr int kWidth = 40;
   char bar[kWidth + 1];
-  for (int i = 0; i < kWidth; ++i) bar[i] = i < percent * kWidth / 100 ? '#' : '.';
+  for (int i = 0; i < kWidth; ++i)
+    bar[i] = i < percent * kWidth / 100 ? '#' : '.';
   bar[kWidth] = '\0';
   std::fprintf(m_pStream, "\r%s [%s] %3d%%", m_label.GetStr(), bar, percent);
   std::fflush(m_pStream);

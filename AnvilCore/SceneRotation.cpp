@@ -36,7 +36,8 @@ void axisRotationMatrix(double i_degrees, int i_axis, double o_m[9]) {
     s = std::sin(r);
   }
   const int a = (i_axis + 1) % 3, b = (i_axis + 2) % 3;
-  for (int i = 0; i < 9; ++i) o_m[i] = 0.0;
+  for (int i = 0; i < 9; ++i)
+    o_m[i] = 0.0;
   o_m[i_axis * 3 + i_axis] = 1.0;
   o_m[a * 3 + a] = c;
   o_m[a * 3 + b] = -s;

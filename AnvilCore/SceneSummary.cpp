@@ -1,13 +1,13 @@
 #include "SceneSummary.h"
 #include "plugin/host/AudioSource.h"
 #include "plugin/host/Character.h"
-#include "plugin/host/NLEClip.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/HTimeManager.h"
 #include "plugin/host/Marker.h"
+#include "plugin/host/NLEClip.h"
 #include "plugin/host/OpticalCamera.h"
-#include "plugin/host/VideoCamera.h"
 #include "plugin/host/SubjectManager.h"
+#include "plugin/host/VideoCamera.h"
 #include <cstdio>
 #include <string>
 #include <vector>
@@ -26,7 +26,8 @@ void nameList(std::ostream& o_rOut, const char* i_pTitle, const std::vector<std:
   o_rOut << i_pTitle << ": " << i_names.size();
   if (!i_names.empty()) {
     o_rOut << "\n ";
-    for (const std::string& name : i_names) o_rOut << ' ' << name;
+    for (const std::string& name : i_names)
+      o_rOut << ' ' << name;
   }
   o_rOut << '\n';
 }
@@ -36,8 +37,8 @@ void describeScene(std::ostream& o_rOut) {
   const HTimeManager* pTime = g_db->getTimeManager();
   char rate[64];
   std::snprintf(rate, sizeof rate, "%g", pTime->getFrameRate());
-  o_rOut << "scene: " << (g_db->getSceneName().IsEmpty() ? "(unnamed)" : g_db->getSceneName().GetStr())
-         << '\n'
+  o_rOut << "scene: "
+         << (g_db->getSceneName().IsEmpty() ? "(unnamed)" : g_db->getSceneName().GetStr()) << '\n'
          << "frame rate: " << rate << " Hz\n"
          << "animation range: " << frames(pTime->getAnimRange()) << '\n'
          << "play range: " << frames(pTime->getPlayRange()) << '\n'
@@ -56,7 +57,8 @@ void describeScene(std::ostream& o_rOut) {
   const SubjectManager* pSubjects = g_db->getSubjectManager();
   for (int i = 0; i < pSubjects->getNumSubjects(); ++i) {
     const Character* pSubject = pSubjects->getSubject(i);
-    subjects.push_back(std::string(pSubject->getName().GetStr()) + (pSubject->isProp() ? " (prop)" : ""));
+    subjects.push_back(std::string(pSubject->getName().GetStr()) +
+                       (pSubject->isProp() ? " (prop)" : ""));
   }
   nameList(o_rOut, "subjects", subjects);
 

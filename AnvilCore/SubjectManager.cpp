@@ -1,7 +1,7 @@
 #include "plugin/host/SubjectManager.h"
 #include "plugin/host/Character.h"
-#include "plugin/host/Marker.h"
 #include "plugin/host/Database.h"
+#include "plugin/host/Marker.h"
 #include <vector>
 
 namespace {
@@ -22,8 +22,12 @@ Character* at(const std::vector<Character*>& i_rList, int i_index) {
 }
 } // namespace
 
-int SubjectManager::getNumSubjects() const { return static_cast<int>(subjects(false).size()); }
-Character* SubjectManager::getSubject(int i_index) const { return at(subjects(false), i_index); }
+int SubjectManager::getNumSubjects() const {
+  return static_cast<int>(subjects(false).size());
+}
+Character* SubjectManager::getSubject(int i_index) const {
+  return at(subjects(false), i_index);
+}
 int SubjectManager::getNumSelectedSubjects() const {
   return static_cast<int>(subjects(true).size());
 }

@@ -18,9 +18,9 @@ constexpr int kMarkers = 200;
 constexpr int kFrames = 36000;
 
 struct LongTakeShape {
-  const char* markerPrefix = "M";  ///< marker names are prefix + index
-  const char* subject = nullptr;   ///< when set, the markers sit under a subject of that name
-  bool gaps = false;               ///< drop a few frames of each marker now and then
+  const char* markerPrefix = "M"; ///< marker names are prefix + index
+  const char* subject = nullptr;  ///< when set, the markers sit under a subject of that name
+  bool gaps = false;              ///< drop a few frames of each marker now and then
 };
 
 /// Builds the take into `g_db` on first call (later calls return the same markers).

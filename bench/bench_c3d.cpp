@@ -20,9 +20,13 @@
 namespace {
 using namespace Bench;
 
-void buildScene() { longTake({"Subject:M", nullptr, true}); }
+void buildScene() {
+  longTake({"Subject:M", nullptr, true});
+}
 
-std::string outputPath(const char* i_pSuffix) { return tempOutput(i_pSuffix); }
+std::string outputPath(const char* i_pSuffix) {
+  return tempOutput(i_pSuffix);
+}
 
 // File size of each form's export, for its floor.
 std::map<bool, uintmax_t>& exportedBytes() {

@@ -16,7 +16,9 @@ namespace {
 using Bench::kFrames;
 using Bench::kMarkers;
 
-std::vector<Marker*>& buildScene() { return Bench::longTake({"M", "Bench", false}); }
+std::vector<Marker*>& buildScene() {
+  return Bench::longTake({"M", "Bench", false});
+}
 
 // A stream that counts and discards what is written to it.
 FILE* countingStream(long long* o_pCount) {

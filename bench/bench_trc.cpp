@@ -46,7 +46,8 @@ void BM_SnprintfFloor(benchmark::State& state) {
       buffer.append(text, size_t(std::snprintf(text, sizeof text, "%d\t%f", f, f / 120.0)));
       for (const Marker* pMarker : markers) {
         const Vec3& p = pMarker->m_track.getKeyValue(f);
-        buffer.append(text, size_t(std::snprintf(text, sizeof text, "\t%f\t%f\t%f", p.x, p.y, p.z)));
+        buffer.append(text,
+                      size_t(std::snprintf(text, sizeof text, "\t%f\t%f\t%f", p.x, p.y, p.z)));
       }
       buffer += '\n';
     }

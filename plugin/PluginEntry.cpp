@@ -3,10 +3,18 @@
 #include "AnvilFileExportersPlugin.h"
 
 extern "C" {
-unsigned int apiVersion() { return kAnvilFileExportApiVersion; }
-bool isDebug() { return false; }
-unsigned int getNumPlugins() { return 2; }
-bool isAxiom() { return false; }
+unsigned int apiVersion() {
+  return kAnvilFileExportApiVersion;
+}
+bool isDebug() {
+  return false;
+}
+unsigned int getNumPlugins() {
+  return 2;
+}
+bool isAxiom() {
+  return false;
+}
 
 DruCorePluginBase* getPlugin(int i_index) {
   switch (i_index) {

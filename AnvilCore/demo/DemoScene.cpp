@@ -1,4 +1,5 @@
 #include "DemoScene.h"
+#include "AnvilCore/SubjectJointPose.h"
 #include "DemoWalk.h"
 #include "plugin/host/Character.h"
 #include "plugin/host/Database.h"
@@ -9,7 +10,6 @@
 #include "plugin/host/RetargetingSetup.h"
 #include "plugin/host/SolvingSetup.h"
 #include "plugin/host/SubjectBone.h"
-#include "AnvilCore/SubjectJointPose.h"
 #include <algorithm>
 #include <map>
 
@@ -29,8 +29,11 @@ struct Gap {
   const char* marker;
   int first, last;
 };
-const Gap kGaps[] = {{"LWRB", 300, 340}, {"RTOE", 700, 712}, {"LFIN", 1000, 1050},
-                     {"RBAK", 0, 5},     {"LHEE", 1190, 1199}};
+const Gap kGaps[] = {{"LWRB", 300, 340},
+                     {"RTOE", 700, 712},
+                     {"LFIN", 1000, 1050},
+                     {"RBAK", 0, 5},
+                     {"LHEE", 1190, 1199}};
 
 bool inGap(const std::string& i_rName, int i_frame) {
   return std::any_of(std::begin(kGaps), std::end(kGaps), [&](const Gap& g) {
@@ -139,7 +142,8 @@ void buildDemoScene() {
     return true;
   });
 
-  for (auto& [order, part] : parts()) part();
+  for (auto& [order, part] : parts())
+    part();
 }
 
 } // namespace AnvilCore

@@ -12,7 +12,9 @@ using DemoPart = std::function<void()>;
 void registerDemoPart(int i_order, DemoPart i_part);
 
 struct DemoPartRegistration {
-  DemoPartRegistration(int i_order, DemoPart i_part) { registerDemoPart(i_order, std::move(i_part)); }
+  DemoPartRegistration(int i_order, DemoPart i_part) {
+    registerDemoPart(i_order, std::move(i_part));
+  }
 };
 
 } // namespace AnvilCore

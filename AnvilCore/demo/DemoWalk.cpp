@@ -27,7 +27,7 @@ const std::vector<std::string> kNames = {
 using JointType = VJointTypeBase::EJointType;
 enum EAxes { ENone, EAboutY, EFootPair, EShoulderPair };
 
-struct SegmentSpec {
+struct SegmentShape {
   const char* name;
   int parent; // index, -1 for the root
   JointType type;
@@ -36,7 +36,7 @@ struct SegmentSpec {
 };
 
 // Left side first, the right mirrors it in Y.
-const SegmentSpec kSegments[] = {
+const SegmentShape kSegments[] = {
     {"Pelvis", -1, VJointTypeBase::EFree, ENone, 0, 0, 0},
     {"LFemur", 0, VJointTypeBase::EBall, ENone, 0, 90, -60},
     {"LTibia", 1, VJointTypeBase::EHinge, EAboutY, 0, 0, -kThigh},
@@ -131,23 +131,23 @@ SubjectRecords demoWalkRecords() {
   records.application.m_SubjectId = subject.m_SubjectId;
   records.application.m_Colour = {40, 120, 220, 255};
   for (int i = 0; i < kSegmentCount; ++i) {
-    const SegmentSpec& spec = kSegments[i];
+    const SegmentShape& shape = kSegments[i];
     VSubjectParametrised::VSegment segment;
-    segment.m_Name = spec.name;
+    segment.m_Name = shape.name;
     segment.m_SegmentIndex = static_cast<uint32_t>(i);
-    if (spec.parent >= 0) {
-      segment.m_ParentSegmentIndex = static_cast<uint32_t>(spec.parent);
-      segment.m_TreeDepth = subject.m_Segments[size_t(spec.parent)].m_TreeDepth + 1;
+    if (shape.parent >= 0) {
+      segment.m_ParentSegmentIndex = static_cast<uint32_t>(shape.parent);
+      segment.m_TreeDepth = subject.m_Segments[size_t(shape.parent)].m_TreeDepth + 1;
     }
     segment.m_Joint.m_Name =
-        std::string(spec.parent >= 0 ? kSegments[spec.parent].name : "World") + "_" + spec.name;
-    segment.m_Joint.m_JointType = spec.type;
-    segment.m_Joint.m_JointOrientation = orientation(spec.axes);
-    segment.m_PreTranslation = texts(spec.x, spec.y, spec.z);
+        std::string(shape.parent >= 0 ? kSegments[shape.parent].name : "World") + "_" + shape.name;
+    segment.m_Joint.m_JointType = shape.type;
+    segment.m_Joint.m_JointOrientation = orientation(shape.axes);
+    segment.m_PreTranslation = texts(shape.x, shape.y, shape.z);
     segment.m_PreRotation = texts(0, 0, 0);
     subject.m_Segments.push_back(segment);
     VSubjectApplicationData::VSegment app;
-    app.m_Context = spec.name[0] == 'L' ? "Left" : (spec.name[0] == 'R' ? "Right" : "");
+    app.m_Context = shape.name[0] == 'L' ? "Left" : (shape.name[0] == 'R' ? "Right" : "");
     records.application.m_Segments.push_back(app);
   }
   for (size_t m = 0; m < kNames.size(); ++m) {

@@ -10,7 +10,8 @@ namespace AnvilCore {
 std::vector<std::string> readableExtensions() {
   std::vector<std::string> result;
   for (const auto& pReader : SceneReaderRegistry::instance().readers())
-    for (const std::string& ext : pReader->extensions()) result.push_back(ext);
+    for (const std::string& ext : pReader->extensions())
+      result.push_back(ext);
   std::sort(result.begin(), result.end());
   return result;
 }
@@ -33,7 +34,8 @@ bool loadSceneInputs(const std::vector<std::string>& i_inputs, std::string& o_rE
     ISceneReader* pReader = SceneReaderRegistry::instance().find(input);
     if (!pReader) {
       std::string known;
-      for (const std::string& ext : readableExtensions()) known += (known.empty() ? "." : ", .") + ext;
+      for (const std::string& ext : readableExtensions())
+        known += (known.empty() ? "." : ", .") + ext;
       o_rError = input + ": unknown input format (readable: demo, " + known + ")";
       return false;
     }

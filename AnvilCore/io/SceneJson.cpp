@@ -82,14 +82,14 @@ std::string name(const nlohmann::json& i_rValue, const std::string& i_path) {
   return text;
 }
 
-std::vector<double> numbers(const nlohmann::json& i_rValue, const std::string& i_path,
-                            size_t i_n) {
+std::vector<double> numbers(const nlohmann::json& i_rValue, const std::string& i_path, size_t i_n) {
   array(i_rValue, i_path);
   if (i_rValue.size() != i_n)
-    fail(i_path, "expected " + std::to_string(i_n) + " numbers, found " +
-                     std::to_string(i_rValue.size()));
+    fail(i_path,
+         "expected " + std::to_string(i_n) + " numbers, found " + std::to_string(i_rValue.size()));
   std::vector<double> values;
-  for (size_t i = 0; i < i_n; ++i) values.push_back(number(i_rValue[i], i_path + "/" + std::to_string(i)));
+  for (size_t i = 0; i < i_n; ++i)
+    values.push_back(number(i_rValue[i], i_path + "/" + std::to_string(i)));
   return values;
 }
 
@@ -121,7 +121,8 @@ std::optional<HTimeRange> keySpan(Module& i_rRoot) {
     include(pNode->m_positionTrack.times());
     include(pNode->m_rotationTrack.times());
     include(pNode->m_scaleTrack.times());
-    if (p->isKindOf(&Marker::s_classMarker)) include(static_cast<const Marker*>(p)->m_track.times());
+    if (p->isKindOf(&Marker::s_classMarker))
+      include(static_cast<const Marker*>(p)->m_track.times());
   }
   return span;
 }
@@ -132,7 +133,8 @@ void extendAnimRange(const HTimeRange& i_rSpan) {
   // A scene that already holds data keeps its range and grows to cover the new keys.
   if (g_db->getNumNodes() > 0) {
     const HTimeRange& old = pTime->getAnimRange();
-    range = HTimeRange(std::min(old.getStart(), range.getStart()), std::max(old.getEnd(), range.getEnd()));
+    range = HTimeRange(std::min(old.getStart(), range.getStart()),
+                       std::max(old.getEnd(), range.getEnd()));
   }
   pTime->setAnimRange(range);
   pTime->setPlayRange(range);
@@ -170,7 +172,8 @@ bool readSceneJson(const std::string& i_text, const std::string& i_source, std::
     return false;
   }
   // Scene-wide settings first (the rate decides the range below), then the modules.
-  for (auto& commit : context.commits) commit();
+  for (auto& commit : context.commits)
+    commit();
   if (!context.animRangeSet)
     if (std::optional<HTimeRange> span = keySpan(*context.root)) extendAnimRange(*span);
   while (context.root->getNumChildren() > 0)

@@ -3,8 +3,8 @@
 #include <functional>
 #include <map>
 #include <memory>
-#include <optional>
 #include <nlohmann/json.hpp>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -38,9 +38,8 @@ struct SceneJsonError {
 };
 
 /// Reads one top-level section of a scene file.
-using SceneSectionReader =
-    std::function<void(const nlohmann::json& i_rValue, const std::string& i_path,
-                       SceneJsonContext& io_rContext)>;
+using SceneSectionReader = std::function<void(
+    const nlohmann::json& i_rValue, const std::string& i_path, SceneJsonContext& io_rContext)>;
 
 /// Top-level sections by key. A new section is one function plus one
 /// `ANVIL_REGISTER_SCENE_SECTION` line; `order` fixes reading order (lower first).
@@ -100,5 +99,5 @@ void onlyKeys(const nlohmann::json& i_rObject, const std::string& i_path,
 #define ANVIL_SCENE_CAT2(a, b) a##b
 #define ANVIL_SCENE_CAT(a, b) ANVIL_SCENE_CAT2(a, b)
 #define ANVIL_REGISTER_SCENE_SECTION(key, order, reader)                                           \
-  static const ::AnvilCore::SceneSectionRegistration ANVIL_SCENE_CAT(s_section_, __LINE__)(       \
+  static const ::AnvilCore::SceneSectionRegistration ANVIL_SCENE_CAT(s_section_, __LINE__)(        \
       key, order, reader);

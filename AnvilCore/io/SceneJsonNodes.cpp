@@ -1,6 +1,6 @@
 #include "SceneJsonNodes.h"
-#include "plugin/host/Database.h"
 #include "plugin/host/Character.h"
+#include "plugin/host/Database.h"
 #include "plugin/host/Marker.h"
 
 namespace AnvilCore {
@@ -31,7 +31,8 @@ HTime frameTime(const SceneJsonContext& i_rContext, int64_t i_frame) {
 }
 } // namespace
 
-void checkUniqueName(const Module* i_pParent, const std::string& i_name, const std::string& i_path) {
+void checkUniqueName(const Module* i_pParent, const std::string& i_name,
+                     const std::string& i_path) {
   for (int i = 0; i < i_pParent->getNumChildren(); ++i)
     if (i_pParent->getChild(i)->getName() == i_name.c_str())
       json::fail(i_path, "duplicate name \"" + i_name + "\"");
@@ -41,7 +42,8 @@ void readTransform(const nlohmann::json& i_rValue, const std::string& i_path,
                    SceneJsonContext& io_rContext, Node& io_rNode) {
   using namespace json;
   AnvilRotation::RotOrder order = AnvilRotation::XYZ;
-  if (auto* p = optional(i_rValue, "rotationOrder")) order = rotationOrder(*p, i_path + "/rotationOrder");
+  if (auto* p = optional(i_rValue, "rotationOrder"))
+    order = rotationOrder(*p, i_path + "/rotationOrder");
   io_rNode.setRotationOrder(order);
   if (auto* p = optional(i_rValue, "preTranslation"))
     io_rNode.setPreTranslation(vec3(*p, i_path + "/preTranslation"));
@@ -87,15 +89,19 @@ void readTransform(const nlohmann::json& i_rValue, const std::string& i_path,
 Marker* readMarker(const nlohmann::json& i_rValue, const std::string& i_path,
                    SceneJsonContext& io_rContext, Module* i_pParent) {
   using namespace json;
-  onlyKeys(i_rValue, i_path, {"name", "unlabeled", "selected", "visible", "firstFrame", "positions"});
+  onlyKeys(i_rValue, i_path,
+           {"name", "unlabeled", "selected", "visible", "firstFrame", "positions"});
   const std::string markerName = name(member(i_rValue, i_path, "name"), i_path + "/name");
   checkUniqueName(i_pParent, markerName, i_path + "/name");
   auto pMarker = std::make_unique<Marker>(HString(markerName));
   // A marker outside any subject is an unlabelled trajectory unless the file says otherwise.
   pMarker->setUnlabeled(!i_pParent->isKindOf(&Character::s_classCharacter));
-  if (auto* p = optional(i_rValue, "unlabeled")) pMarker->setUnlabeled(boolean(*p, i_path + "/unlabeled"));
-  if (auto* p = optional(i_rValue, "selected")) pMarker->setSelected(boolean(*p, i_path + "/selected"));
-  if (auto* p = optional(i_rValue, "visible")) pMarker->setVisible(boolean(*p, i_path + "/visible"));
+  if (auto* p = optional(i_rValue, "unlabeled"))
+    pMarker->setUnlabeled(boolean(*p, i_path + "/unlabeled"));
+  if (auto* p = optional(i_rValue, "selected"))
+    pMarker->setSelected(boolean(*p, i_path + "/selected"));
+  if (auto* p = optional(i_rValue, "visible"))
+    pMarker->setVisible(boolean(*p, i_path + "/visible"));
   int64_t first = 0;
   if (auto* p = optional(i_rValue, "firstFrame")) first = integer(*p, i_path + "/firstFrame");
   if (auto* pPositions = optional(i_rValue, "positions")) {
@@ -117,11 +123,13 @@ Marker* readMarker(const nlohmann::json& i_rValue, const std::string& i_path,
 Node* readNode(const nlohmann::json& i_rValue, const std::string& i_path,
                SceneJsonContext& io_rContext, Module* i_pParent) {
   using namespace json;
-  onlyKeys(i_rValue, i_path, {"name", "selected", "visible", "children", ANVIL_SCENE_TRANSFORM_KEYS});
+  onlyKeys(i_rValue, i_path,
+           {"name", "selected", "visible", "children", ANVIL_SCENE_TRANSFORM_KEYS});
   const std::string nodeName = name(member(i_rValue, i_path, "name"), i_path + "/name");
   checkUniqueName(i_pParent, nodeName, i_path + "/name");
   auto pNode = std::make_unique<Node>(HString(nodeName));
-  if (auto* p = optional(i_rValue, "selected")) pNode->setSelected(boolean(*p, i_path + "/selected"));
+  if (auto* p = optional(i_rValue, "selected"))
+    pNode->setSelected(boolean(*p, i_path + "/selected"));
   if (auto* p = optional(i_rValue, "visible")) pNode->setVisible(boolean(*p, i_path + "/visible"));
   readTransform(i_rValue, i_path, io_rContext, *pNode);
   Node* pResult = pNode.get();

@@ -21,8 +21,7 @@ void readVersion(const nlohmann::json& i_rValue, const std::string& i_path, Scen
   const int64_t version = json::integer(i_rValue, i_path);
   if (version < 1 || version > kSceneFileVersion)
     json::fail(i_path, "unsupported scene file version " + std::to_string(version) +
-                           " (this build reads version " + std::to_string(kSceneFileVersion) +
-                           ")");
+                           " (this build reads version " + std::to_string(kSceneFileVersion) + ")");
 }
 
 void readName(const nlohmann::json& i_rValue, const std::string& i_path,
@@ -50,7 +49,8 @@ HTimeRange frameRange(const nlohmann::json& i_rValue, const std::string& i_path,
 void readTime(const nlohmann::json& i_rValue, const std::string& i_path,
               SceneJsonContext& io_rContext) {
   using namespace json;
-  onlyKeys(i_rValue, i_path, {"frameRate", "animRange", "playRange", "timecodeMode", "currentFrame"});
+  onlyKeys(i_rValue, i_path,
+           {"frameRate", "animRange", "playRange", "timecodeMode", "currentFrame"});
   const double rate = number(member(i_rValue, i_path, "frameRate"), i_path + "/frameRate");
   if (rate <= 0.0 || rate > 100000.0)
     fail(i_path + "/frameRate", "frame rate must lie in (0, 100000]");
@@ -91,8 +91,10 @@ void readSubjects(const nlohmann::json& i_rValue, const std::string& i_path,
     checkUniqueName(io_rContext.root.get(), subjectName, path + "/name");
     auto pCharacter = std::make_unique<Character>(HString(subjectName));
     if (auto* p = optional(subject, "prop")) pCharacter->setProp(boolean(*p, path + "/prop"));
-    if (auto* p = optional(subject, "selected")) pCharacter->setSelected(boolean(*p, path + "/selected"));
-    if (auto* p = optional(subject, "visible")) pCharacter->setVisible(boolean(*p, path + "/visible"));
+    if (auto* p = optional(subject, "selected"))
+      pCharacter->setSelected(boolean(*p, path + "/selected"));
+    if (auto* p = optional(subject, "visible"))
+      pCharacter->setVisible(boolean(*p, path + "/visible"));
     readTransform(subject, path, io_rContext, *pCharacter);
     readSubjectSetups(subject, path, io_rContext, *pCharacter);
     Character* pSubject = pCharacter.get();

@@ -48,8 +48,8 @@ std::array<std::string, 3> AsExpressions(const std::array<double, 3>& values) {
 /// documentation of the orientation.
 void ReadPost(INode& node, VSubjectKMTExtras::VSegment& io_rExtras,
               const std::string& orientationDocumentation) {
-  if (ReadExpressions(node, "POST-ORIENTATION", io_rExtras.m_PostRotation,
-                      orientationDocumentation, false, V2_0, V3_1)) {
+  if (ReadExpressions(node, "POST-ORIENTATION", io_rExtras.m_PostRotation, orientationDocumentation,
+                      false, V2_0, V3_1)) {
     io_rExtras.m_HasPost = true;
   }
   if (ReadExpressions(node, "POST-POSITION", io_rExtras.m_PostTranslation,

@@ -4,7 +4,9 @@
 
 namespace anvil {
 
-void printError(const std::string& i_rText) { std::fprintf(stderr, "anvil: %s\n", i_rText.c_str()); }
+void printError(const std::string& i_rText) {
+  std::fprintf(stderr, "anvil: %s\n", i_rText.c_str());
+}
 
 void installLogSink(bool i_verbose) {
   g_db->setLogSink([i_verbose](HLogLevel i_level, const std::string& i_rText) {

@@ -71,8 +71,10 @@ int runExport(const CommonArgs& i_rCommon, const ExportArgs& i_rArgs) {
     exporters.push_back(pExporter);
   }
   // Options persist from one run to the next; script commands change them after this.
-  for (int i = 0; i < pMgr->getNumExporters(); ++i) pMgr->getExporterAt(i)->loadUserSetup();
-  if (const int code = runExportCommands(module, i_rArgs.scripts, i_rArgs.commandLines); code != EExitOk)
+  for (int i = 0; i < pMgr->getNumExporters(); ++i)
+    pMgr->getExporterAt(i)->loadUserSetup();
+  if (const int code = runExportCommands(module, i_rArgs.scripts, i_rArgs.commandLines);
+      code != EExitOk)
     return code;
 
   if (!AnvilCore::loadSceneInputs(i_rArgs.inputs, error)) {

@@ -1,8 +1,8 @@
+#include "AnvilCore/SceneSummary.h"
+#include "AnvilCore/io/SceneInputs.h"
 #include "ModuleLoader.h"
 #include "Subcommands.h"
 #include "SubjectSummary.h"
-#include "AnvilCore/SceneSummary.h"
-#include "AnvilCore/io/SceneInputs.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/FileExporter.h"
 #include <cstdio>

@@ -22,9 +22,11 @@ std::filesystem::path programFolder() {
 
 std::string LoadedModule::defaultPath() {
   const std::filesystem::path folder = programFolder();
-  for (const std::filesystem::path& candidate : {folder / kModuleFile, folder / ".." / "lib" / kModuleFile}) {
+  for (const std::filesystem::path& candidate :
+       {folder / kModuleFile, folder / ".." / "lib" / kModuleFile}) {
     std::error_code ec;
-    if (std::filesystem::exists(candidate, ec)) return std::filesystem::weakly_canonical(candidate).string();
+    if (std::filesystem::exists(candidate, ec))
+      return std::filesystem::weakly_canonical(candidate).string();
   }
   return (folder / kModuleFile).string();
 }
@@ -44,13 +46,15 @@ bool LoadedModule::load(const std::string& i_path, std::string& o_rError) {
   auto getNumPlugins = reinterpret_cast<NumPluginsFn>(::dlsym(m_pHandle, "getNumPlugins"));
   auto getPlugin = reinterpret_cast<GetPluginFn>(::dlsym(m_pHandle, "getPlugin"));
   if (!apiVersion || !getNumPlugins || !getPlugin) {
-    o_rError = "'" + m_path + "' is not an export module (apiVersion, getNumPlugins or getPlugin missing)";
+    o_rError =
+        "'" + m_path + "' is not an export module (apiVersion, getNumPlugins or getPlugin missing)";
     return false;
   }
   if (const unsigned int version = apiVersion(); version != kHostApiVersion) {
     char text[160];
-    std::snprintf(text, sizeof text, "export module API version 0x%X is not supported (expected 0x%X)",
-                  version, kHostApiVersion);
+    std::snprintf(text, sizeof text,
+                  "export module API version 0x%X is not supported (expected 0x%X)", version,
+                  kHostApiVersion);
     o_rError = "'" + m_path + "': " + text;
     return false;
   }

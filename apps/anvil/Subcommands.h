@@ -9,9 +9,9 @@ namespace anvil {
 enum ExitCode : int { EExitOk = 0, EExitWriteFailed = 1, EExitUsage = 2 };
 
 struct CommonArgs {
-  std::string modulePath;     ///< --module; empty: next to the program
-  std::string userSetupPath;  ///< --user-setup; empty: the default location
-  bool verbose = false;       ///< show info lines of the log
+  std::string modulePath;    ///< --module; empty: next to the program
+  std::string userSetupPath; ///< --user-setup; empty: the default location
+  bool verbose = false;      ///< show info lines of the log
 };
 
 struct ExportArgs {

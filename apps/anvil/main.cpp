@@ -18,12 +18,15 @@ int main(int argc, char** argv) {
   ExportArgs exportArgs;
   CLI::App* pExport = app.add_subcommand("export", "Load inputs into one scene and export it");
   pExport->add_option("inputs", exportArgs.inputs, "'demo' or scene files")->required();
-  pExport->add_option("-o,--output", exportArgs.outputs, "Output file; the extension picks the exporter")
+  pExport
+      ->add_option("-o,--output", exportArgs.outputs,
+                   "Output file; the extension picks the exporter")
       ->required();
   pExport->add_option("--range", exportArgs.range, "Frames to export, FIRST:LAST");
   pExport->add_flag("--selected", exportArgs.selectedOnly, "Export only selected modules");
-  pExport->add_option("-c,--command", exportArgs.commandLines,
-                      "Option command line run before exporting, e.g. 'c3dExportOptions -real false'")
+  pExport
+      ->add_option("-c,--command", exportArgs.commandLines,
+                   "Option command line run before exporting, e.g. 'c3dExportOptions -real false'")
       ->allow_extra_args(false);
   pExport->add_option("--script", exportArgs.scripts, "File of option command lines")
       ->allow_extra_args(false);
@@ -37,14 +40,18 @@ int main(int argc, char** argv) {
 
   std::vector<std::string> infoInputs;
   CLI::App* pInfo = app.add_subcommand("info", "Summarise a scene");
-  pInfo->add_option("inputs", infoInputs, "'demo', scene files or subject files (.kmt .kmf .kms .kmr)")->required();
+  pInfo
+      ->add_option("inputs", infoInputs,
+                   "'demo', scene files or subject files (.kmt .kmf .kms .kmr)")
+      ->required();
 
   std::string schemaLanguage, schemaOutput;
   CLI::App* pSchema = app.add_subcommand("schema", "Write the XSD of a file language");
   pSchema->add_option("language", schemaLanguage, "'kmt'")->required();
   pSchema->add_option("-o,--output", schemaOutput, "Output file")->required();
 
-  CLI::App* pCommands = app.add_subcommand("commands", "List the option commands and their options");
+  CLI::App* pCommands =
+      app.add_subcommand("commands", "List the option commands and their options");
   pCommands->add_option("--module", common.modulePath, "Path of libAnvilFileExport.so");
 
   try {

@@ -57,8 +57,8 @@ public:
   /// Forgets the subject names, markers and audio sources of the last `write`.
   void reset() override;
   /// Exports the module list over the time range. False, with nothing logged, for an empty
-  /// module list or no stream; false with a logged error for an override rate outside (0, 10000) or a range
-  /// starting before frame 0 (the scene then stays rotated).
+  /// module list or no stream; false with a logged error for an override rate outside (0, 10000) or
+  /// a range starting before frame 0 (the scene then stays rotated).
   bool write() override;
 
   bool getPreserveGaps() const { return m_options.m_preserveGaps; }

@@ -26,7 +26,9 @@ void appendPosition(std::string& io_rLine, const Node* i_pNode, HTime i_t) {
 }
 } // namespace
 
-TrcExporter* TrcExporter::createInstance() { return new TrcExporter(); }
+TrcExporter* TrcExporter::createInstance() {
+  return new TrcExporter();
+}
 
 TrcExporter::TrcExporter() : FileExporter(false, "trc", false), m_markers(16), m_extraNodes(16) {}
 
@@ -47,17 +49,16 @@ bool TrcExporter::recognize(const HString& i_rFilename) {
 void TrcExporter::loadUserSetup() {
   const HString& scope = HString::EMPTY_STRING;
   // "WriteUnlabelled" defaults to the write-subjects flag, not to its own value.
-  m_options.m_writeUnlabelled =
-      g_interface.getUserSetupInt(kSection, "WriteUnlabelled", m_options.m_writeSubjects, scope) !=
-      0;
+  m_options.m_writeUnlabelled = g_interface.getUserSetupInt(kSection, "WriteUnlabelled",
+                                                            m_options.m_writeSubjects, scope) != 0;
   m_options.m_writeSubjects = g_interface.getUserSetupInt(kSection, "ExportSubjectNames",
                                                           m_options.m_writeSubjects, scope) != 0;
   m_options.m_removeLeadingUnderscores =
       g_interface.getUserSetupInt(kSection, "RemoveLeadingUnderscores",
                                   m_options.m_removeLeadingUnderscores, scope) != 0;
-  m_options.m_collapseSubjects = g_interface.getUserSetupInt(
-                                     kSection, "CollapseSubjectNames",
-                                     m_options.m_collapseSubjects, scope) != 0;
+  m_options.m_collapseSubjects =
+      g_interface.getUserSetupInt(kSection, "CollapseSubjectNames", m_options.m_collapseSubjects,
+                                  scope) != 0;
 }
 
 void TrcExporter::saveUserSetup() const {
@@ -119,11 +120,13 @@ void TrcExporter::writeHeader() {
   std::fprintf(m_pFile, "%d\n", frames);
 
   std::fprintf(m_pFile, "Frame#\tTime\t");
-  for (const Node* pMarker : m_markers) std::fprintf(m_pFile, "%s\t\t\t", displayName(pMarker).GetStr());
+  for (const Node* pMarker : m_markers)
+    std::fprintf(m_pFile, "%s\t\t\t", displayName(pMarker).GetStr());
   std::fprintf(m_pFile, "\n");
 
   std::fprintf(m_pFile, "\t\t");
-  for (int i = 0; i < markers; ++i) std::fprintf(m_pFile, "X%d\tY%d\tZ%d\t", i, i, i);
+  for (int i = 0; i < markers; ++i)
+    std::fprintf(m_pFile, "X%d\tY%d\tZ%d\t", i, i, i);
   std::fprintf(m_pFile, "\n");
 }
 
@@ -145,8 +148,10 @@ void TrcExporter::writeFrames() {
     char text[64];
     const int n = std::snprintf(text, sizeof text, "%d\t%f", frame, frame * step);
     line.assign(text, n > 0 ? static_cast<size_t>(n) : 0);
-    for (const Node* pNode : m_markers) appendPosition(line, pNode, t);
-    for (const Node* pNode : m_extraNodes) appendPosition(line, pNode, t);
+    for (const Node* pNode : m_markers)
+      appendPosition(line, pNode, t);
+    for (const Node* pNode : m_extraNodes)
+      appendPosition(line, pNode, t);
     std::fprintf(m_pFile, "%s", line.c_str());
     std::fprintf(m_pFile, "\n");
     if (s_doProgress && i % 10 == 0) g_theOperationStack.stepTask();

@@ -55,8 +55,8 @@ public:
 
   /// Adds a module to the scene under `i_pCharacter`, or at the top when it is null. The
   /// database takes ownership. The flags are the host's and ignored here.
-  void addToScene(Module* i_pModule, bool i_select, const Character* i_pCharacter,
-                  bool i_notify, bool i_undoable);
+  void addToScene(Module* i_pModule, bool i_select, const Character* i_pCharacter, bool i_notify,
+                  bool i_undoable);
   /// Removes and destroys a module and its descendants.
   void removeFromScene(Module* i_pModule, bool i_notify, bool i_undoable, bool i_keepChildren);
   /// Host side: adds a module under any parent module of the scene.

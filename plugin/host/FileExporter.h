@@ -11,12 +11,12 @@ class Module;
 
 /// Bits of `FileExporter::getDataType`: the kinds of module an exporter consumes.
 enum EHostDataType : int {
-  EDataMarkers = 1,        ///< markers, labelled or not
-  EDataReserved = 2,       ///< unused
-  EDataSubjects = 4,       ///< characters (subjects and props)
-  EDataNodes = 8,          ///< other nodes: bones and plain transforms
-  EDataAudio = 16,         ///< audio sources
-  EDataReserved32 = 32,    ///< unused
+  EDataMarkers = 1,     ///< markers, labelled or not
+  EDataReserved = 2,    ///< unused
+  EDataSubjects = 4,    ///< characters (subjects and props)
+  EDataNodes = 8,       ///< other nodes: bones and plain transforms
+  EDataAudio = 16,      ///< audio sources
+  EDataReserved32 = 32, ///< unused
   EDataOpticalCameras = 64,
   EDataVideoCameras = 128,
 };

@@ -14,8 +14,8 @@ public:
                             const HString& i_scope) const;
   int getUserSetupInt(const HString& i_section, const HString& i_key, int i_default,
                       const HString& i_scope) const;
-  HString getUserSetupString(const HString& i_section, const HString& i_key,
-                             const char* i_pDefault, const HString& i_scope) const;
+  HString getUserSetupString(const HString& i_section, const HString& i_key, const char* i_pDefault,
+                             const HString& i_scope) const;
   void setUserSetupBool(const HString& i_section, const HString& i_key, bool i_value,
                         const HString& i_scope);
   void setUserSetupDouble(const HString& i_section, const HString& i_key, double i_value,

@@ -12,7 +12,9 @@ struct ANVIL_HOST_API HRuntimeClass {
 #define H_DECLARE_RUNTIME_CLASS(Name)                                                              \
 public:                                                                                            \
   static const HRuntimeClass s_class##Name;                                                        \
-  const HRuntimeClass* getRuntimeClass() const override { return &s_class##Name; }
+  const HRuntimeClass* getRuntimeClass() const override {                                          \
+    return &s_class##Name;                                                                         \
+  }
 
 /// Defines the tag of `Name` whose base class is `Base`.
 #define H_IMPLEMENT_RUNTIME_CLASS(Name, Base)                                                      \

@@ -23,7 +23,8 @@ public:
   TSimpleArray& operator=(const TSimpleArray& i_rOther) {
     if (this == &i_rOther) return *this;
     setCount(0);
-    for (int i = 0; i < i_rOther.m_count; ++i) add(i_rOther.m_pData[i]);
+    for (int i = 0; i < i_rOther.m_count; ++i)
+      add(i_rOther.m_pData[i]);
     return *this;
   }
   ~TSimpleArray() { std::free(m_pData); }
@@ -50,7 +51,8 @@ public:
   /// Sets the count; growing fills new places with value-initialised elements.
   void setCount(int i_count) {
     if (i_count > m_capacity) addSpace(i_count - m_capacity);
-    for (int i = m_count; i < i_count; ++i) m_pData[i] = T();
+    for (int i = m_count; i < i_count; ++i)
+      m_pData[i] = T();
     m_count = i_count < 0 ? 0 : i_count;
   }
   void removeAll() { m_count = 0; }
@@ -71,7 +73,8 @@ private:
     const int capacity = m_capacity + (i_extra > 0 ? i_extra : m_growStep);
     T* pData = static_cast<T*>(std::malloc(sizeof(T) * static_cast<size_t>(capacity)));
     if (!pData) throw HOutOfMemory();
-    for (int i = 0; i < m_count; ++i) pData[i] = m_pData[i];
+    for (int i = 0; i < m_count; ++i)
+      pData[i] = m_pData[i];
     std::free(m_pData);
     m_pData = pData;
     m_capacity = capacity;
@@ -91,7 +94,8 @@ public:
   TArray& operator=(const TArray& i_rOther) {
     if (this == &i_rOther) return *this;
     removeAll();
-    for (int i = 0; i < i_rOther.m_count; ++i) add(i_rOther[i]);
+    for (int i = 0; i < i_rOther.m_count; ++i)
+      add(i_rOther[i]);
     return *this;
   }
   ~TArray() {
@@ -116,7 +120,8 @@ public:
   const T* begin() const { return m_pData; }
   const T* end() const { return m_pData + m_count; }
   void removeAll() {
-    for (int i = 0; i < m_count; ++i) m_pData[i].~T();
+    for (int i = 0; i < m_count; ++i)
+      m_pData[i].~T();
     m_count = 0;
   }
 

@@ -18,12 +18,14 @@ void expectNear(const Vec3& a, const Vec3& b, double tol = 1e-9) {
 
 TEST(HostArrays, GrowByStepAndKeepElements) {
   TSimpleArray<int> array(16);
-  for (int i = 0; i < 16; ++i) array.add(i * 3);
+  for (int i = 0; i < 16; ++i)
+    array.add(i * 3);
   EXPECT_EQ(array.getCapacity(), 16);
   array.add(99);
   EXPECT_EQ(array.getCapacity(), 32);
   EXPECT_EQ(array.getCount(), 17);
-  for (int i = 0; i < 16; ++i) EXPECT_EQ(array[i], i * 3);
+  for (int i = 0; i < 16; ++i)
+    EXPECT_EQ(array[i], i * 3);
   EXPECT_EQ(array[16], 99);
   array.removeAt(0);
   EXPECT_EQ(array[0], 3);
@@ -32,7 +34,8 @@ TEST(HostArrays, GrowByStepAndKeepElements) {
   EXPECT_TRUE(array.isEmpty());
 
   TArray<HString> strings(2);
-  for (int i = 0; i < 5; ++i) strings.add(HString(std::string(20, char('a' + i))));
+  for (int i = 0; i < 5; ++i)
+    strings.add(HString(std::string(20, char('a' + i))));
   TArray<HString> copy = strings;
   EXPECT_EQ(copy.getCount(), 5);
   EXPECT_EQ(copy[4], HString(std::string(20, 'e')));
@@ -173,8 +176,9 @@ TEST(HostSceneRotation, QuarterTurnsAreExactAndUndoRestoresBits) {
   // Any angle, undone in reverse order, restores the scene too.
   g_db->rotateScene(30.0, 2);
   g_db->rotateScene(-90.0, 1);
-  expectNear(pMarker->getWSPos(0),
-             AnvilRotation(Vec3(0, 1, 0), -90).rotate(AnvilRotation(Vec3(0, 0, 1), 30).rotate(before0)));
+  expectNear(
+      pMarker->getWSPos(0),
+      AnvilRotation(Vec3(0, 1, 0), -90).rotate(AnvilRotation(Vec3(0, 0, 1), 30).rotate(before0)));
   g_db->rotateScene(90.0, 1);
   g_db->rotateScene(-30.0, 2);
   EXPECT_EQ(pMarker->getWSPos(0), before0);

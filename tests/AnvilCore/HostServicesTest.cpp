@@ -14,7 +14,8 @@ namespace fs = std::filesystem;
 
 namespace {
 fs::path scratch(const std::string& i_name) {
-  const fs::path dir = fs::temp_directory_path() / ("anvil-host-test-" + std::to_string(::getpid()));
+  const fs::path dir =
+      fs::temp_directory_path() / ("anvil-host-test-" + std::to_string(::getpid()));
   fs::create_directories(dir);
   return dir / i_name;
 }
@@ -33,7 +34,8 @@ public:
   int getDataType() override { return m_dataType; }
   bool write() override {
     seen.clear();
-    for (Module* p : m_modules) seen.push_back(p->getName().GetStr());
+    for (Module* p : m_modules)
+      seen.push_back(p->getName().GetStr());
     std::fputs("partial", m_pFile);
     if (fail) g_db->logError("probe failed");
     return !fail;

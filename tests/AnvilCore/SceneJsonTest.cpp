@@ -1,7 +1,7 @@
 // The Anvil scene file: what a good file builds, and that every bad one names its fault and
 // leaves the scene alone.
-#include "../support/HostFixture.h"
 #include "AnvilCore/io/SceneJson.h"
+#include "../support/HostFixture.h"
 #include "plugin/host/SubjectManager.h"
 #include <gtest/gtest.h>
 
@@ -72,7 +72,8 @@ TEST(SceneFile, ErrorsNameTheJsonPathAndChangeNothing) {
       {R"({"time": {"frameRate": 0}})", "at /time/frameRate: frame rate must lie in (0, 100000]"},
       {R"({"time": {"frameRate": 60, "animRange": [5, 1]}})",
        "at /time/animRange: last frame comes before first frame"},
-      {R"({"markers": [{"name": "a"}, {"name": "a"}]})", "at /markers/1/name: duplicate name \"a\""},
+      {R"({"markers": [{"name": "a"}, {"name": "a"}]})",
+       "at /markers/1/name: duplicate name \"a\""},
       {R"({"markers": [{"positions": []}]})", "at /markers/0: missing required key \"name\""},
       {R"({"markers": [{"name": "a", "positions": [[1, "2", 3]]}]})",
        "at /markers/0/positions/0/1: expected a number"},

@@ -48,7 +48,8 @@ TEST(PluginEntry, ExportersLoadInTheHostsOrder) {
   for (int i = 0; i < pPlugin->getNumExporters(); ++i) {
     FileExporter* pExporter = pPlugin->getExporter(i);
     const std::string ext = pExporter->getExtension().GetStr();
-    while (next < hostOrder.size() && hostOrder[next] != ext) ++next;
+    while (next < hostOrder.size() && hostOrder[next] != ext)
+      ++next;
     ASSERT_LT(next, hostOrder.size()) << ext << " is out of the host's order";
     EXPECT_TRUE(pExporter->recognize(HString("take." + ext)));
     EXPECT_FALSE(pExporter->recognize(HString("take." + ext + "x")));
@@ -58,9 +59,11 @@ TEST(PluginEntry, ExportersLoadInTheHostsOrder) {
   }
   // The exporters belong to whoever loaded them; the plug-in frees only its array.
   std::vector<FileExporter*> exporters;
-  for (int i = 0; i < pPlugin->getNumExporters(); ++i) exporters.push_back(pPlugin->getExporter(i));
+  for (int i = 0; i < pPlugin->getNumExporters(); ++i)
+    exporters.push_back(pPlugin->getExporter(i));
   pPlugin->deleteThis();
-  for (FileExporter* p : exporters) p->deleteThis();
+  for (FileExporter* p : exporters)
+    p->deleteThis();
 }
 
 TEST(PluginEntry, ExtensionExtraction) {

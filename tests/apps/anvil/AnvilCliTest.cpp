@@ -72,13 +72,15 @@ TEST_F(AnvilCli, ExportsTheDemoToTrc) {
 TEST_F(AnvilCli, UsageErrorsExitTwoAndWriteNothing) {
   CliRun run = anvil("export demo -o " + path("demo.xyz"));
   EXPECT_EQ(run.code, 2);
-  EXPECT_NE(run.output.find("no exporter for this extension (known: "), std::string::npos) << run.output;
+  EXPECT_NE(run.output.find("no exporter for this extension (known: "), std::string::npos)
+      << run.output;
   EXPECT_NE(run.output.find(".trc"), std::string::npos);
 
   std::ofstream(path("bad.json")) << R"({"time": {"frameRate": "fast"}})";
   run = anvil("export " + path("bad.json") + " -o " + path("out.trc"));
   EXPECT_EQ(run.code, 2);
-  EXPECT_NE(run.output.find("at /time/frameRate: expected a number"), std::string::npos) << run.output;
+  EXPECT_NE(run.output.find("at /time/frameRate: expected a number"), std::string::npos)
+      << run.output;
   EXPECT_FALSE(fs::exists(path("out.trc")));
 
   run = anvil("export demo --range 9:3 -o " + path("out.trc"));
@@ -93,7 +95,8 @@ TEST_F(AnvilCli, UsageErrorsExitTwoAndWriteNothing) {
 
   run = anvil(std::string("--module ") + ANVIL_WRONG_API_MODULE + " formats");
   EXPECT_EQ(run.code, 2);
-  EXPECT_NE(run.output.find("API version 0x70000 is not supported"), std::string::npos) << run.output;
+  EXPECT_NE(run.output.find("API version 0x70000 is not supported"), std::string::npos)
+      << run.output;
 }
 
 TEST_F(AnvilCli, UnwritableOutputFailsWithOneMessage) {
@@ -121,4 +124,25 @@ TEST_F(AnvilCli, InfoFormatsAndHelp) {
     EXPECT_EQ(run.code, 0) << sub;
     EXPECT_NE(run.output.find("Usage"), std::string::npos) << sub;
   }
+}
+
+TEST_F(AnvilCli, SubjectFilesAndTheirSchema) {
+  CliRun run = anvil("schema kmt -o " + path("kmt.xsd"));
+  ASSERT_EQ(run.code, 0) << run.output;
+  std::ifstream xsd(path("kmt.xsd"));
+  std::stringstream text;
+  text << xsd.rdbuf();
+  EXPECT_NE(text.str().find("schema"), std::string::npos);
+
+  run = anvil(std::string("info ") + ANVIL_TEST_DATA + "/kmt/v1_0.kmt");
+  ASSERT_EQ(run.code, 0) << run.output;
+  EXPECT_NE(run.output.find("Version: 1.0"), std::string::npos) << run.output;
+  EXPECT_NE(run.output.find("Joints: ball 1, hinge 1"), std::string::npos) << run.output;
+  EXPECT_NE(run.output.find("Hinge joint 'Elbow' is missing AXIS"), std::string::npos);
+
+  // A file that is not a subject file fails to read: exit 1 with the reader's message.
+  std::ofstream(path("broken.kmt")) << "<NotASubject/>";
+  run = anvil("info " + path("broken.kmt"));
+  EXPECT_EQ(run.code, 1) << run.output;
+  EXPECT_FALSE(run.output.empty());
 }

@@ -63,8 +63,9 @@ protected:
     std::fseek(pFile, 0, SEEK_END);
     m_bytes.resize(size_t(std::ftell(pFile)));
     std::rewind(pFile);
-    if (!m_bytes.empty())
+    if (!m_bytes.empty()) {
       EXPECT_EQ(std::fread(m_bytes.data(), 1, m_bytes.size(), pFile), m_bytes.size());
+    }
     std::fclose(pFile);
     m_pExporter->setStream(nullptr);
     return ok;

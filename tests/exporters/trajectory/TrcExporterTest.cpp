@@ -1,7 +1,7 @@
 // TRC text, byte for byte: header lines, names, column numbering, gaps and ranges.
+#include "exporters/trajectory/TrcExporter.h"
 #include "../../support/HostFixture.h"
 #include "../RunExport.h"
-#include "exporters/trajectory/TrcExporter.h"
 #include "plugin/host/HInterface.h"
 #include "plugin/host/OperationStack.h"
 #include <gtest/gtest.h>
@@ -19,7 +19,8 @@ using TrcPtr = std::unique_ptr<TrcExporter, TrcDeleter>;
 std::vector<std::string> lines(const std::string& i_rText) {
   std::vector<std::string> result;
   std::istringstream in(i_rText);
-  for (std::string line; std::getline(in, line);) result.push_back(line);
+  for (std::string line; std::getline(in, line);)
+    result.push_back(line);
   return result;
 }
 
@@ -41,8 +42,10 @@ TEST_F(TrcExport, WholeFileForTwoMarkersWithAGap) {
   addMarker("LFHD", {Vec3(1, 2, 3), std::nullopt, Vec3(7.5, -8.25, 9)}, pBob);
   addMarker("_stray", {Vec3(0, 0, 0), Vec3(0.1, 0.2, 0.3), Vec3(-1, -2, -3)});
   const std::string expected =
-      "PathFileType\t4\t(X/Y/Z)\t" + m_path + "\n"
-      "DataRate\tCameraRate\tNumFrames\tNumMarkers\tUnits\tOrigDataRate\tOrigDataStartFrame\tOrigNumFrames\n"
+      "PathFileType\t4\t(X/Y/Z)\t" + m_path +
+      "\n"
+      "DataRate\tCameraRate\tNumFrames\tNumMarkers\tUnits\tOrigDataRate\tOrigDataStartFrame\tOrigNu"
+      "mFrames\n"
       "100.000000\t100.000000\t3\t2\tmm\t100.000000\t1\t3\n"
       "Frame#\tTime\tLFHD\t\t\t_stray\t\t\t\n"
       "\t\tX0\tY0\tZ0\tX1\tY1\tZ1\t\n"
