@@ -50,10 +50,14 @@ public:
 
   /// Sets the count; growing fills new places with value-initialised elements.
   void setCount(int i_count) {
+    if (i_count <= 0) {
+      m_count = 0;
+      return;
+    }
     if (i_count > m_capacity) addSpace(i_count - m_capacity);
     for (int i = m_count; i < i_count; ++i)
       m_pData[i] = T();
-    m_count = i_count < 0 ? 0 : i_count;
+    m_count = i_count;
   }
   void removeAll() { m_count = 0; }
   void removeAt(int i_index) {
