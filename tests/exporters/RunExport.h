@@ -5,9 +5,11 @@
 #include <filesystem>
 #include <fstream>
 #include <gtest/gtest.h>
+#include <memory>
 #include <sstream>
 #include <string>
 #include <unistd.h>
+#include <vector>
 
 namespace ExportTest {
 
@@ -34,6 +36,21 @@ inline std::string exportText(FileExporter& i_rExporter, const std::string& i_rP
   const AnvilCore::EExportStatus status = AnvilCore::runExport(i_rExporter, request, error);
   EXPECT_EQ(status, AnvilCore::EExportStatus::EOk) << error;
   return readText(i_rPath);
+}
+
+/// An exporter owned by a test, released with `deleteThis` as the host does.
+struct Release {
+  void operator()(FileExporter* i_pExporter) const { i_pExporter->deleteThis(); }
+};
+template <typename T> using Owned = std::unique_ptr<T, Release>;
+
+/// The text split into lines, without their newlines.
+inline std::vector<std::string> lines(const std::string& i_rText) {
+  std::vector<std::string> result;
+  std::istringstream in(i_rText);
+  for (std::string line; std::getline(in, line);)
+    result.push_back(line);
+  return result;
 }
 
 } // namespace ExportTest

@@ -12,18 +12,6 @@
 
 namespace {
 
-struct ExporterDeleter {
-  void operator()(CsmExporter* p) const { p->deleteThis(); }
-};
-
-std::vector<std::string> lines(const std::string& i_rText) {
-  std::vector<std::string> result;
-  std::istringstream in(i_rText);
-  for (std::string line; std::getline(in, line);)
-    result.push_back(line);
-  return result;
-}
-
 class CsmExporterTest : public ::testing::Test {
 protected:
   void SetUp() override {
@@ -54,11 +42,12 @@ protected:
   }
 
   std::vector<std::string> exportLines() {
-    return lines(ExportTest::exportText(*m_pExporter, ExportTest::tempPath("take.csm")));
+    return ExportTest::lines(
+        ExportTest::exportText(*m_pExporter, ExportTest::tempPath("take.csm")));
   }
 
   int64_t m_tpf = 0;
-  std::unique_ptr<CsmExporter, ExporterDeleter> m_pExporter;
+  ExportTest::Owned<CsmExporter> m_pExporter;
 };
 
 TEST_F(CsmExporterTest, WritesHeaderOrderAndPointsOfThePlayRange) {
@@ -126,7 +115,7 @@ TEST_F(CsmExporterTest, UpAxisZTurnsAZUpSceneAndYLeavesIt) {
 }
 
 TEST(CsmExporterOptions, UpAxisTextAndUserSetup) {
-  std::unique_ptr<CsmExporter, ExporterDeleter> pExporter(CsmExporter::createInstance());
+  ExportTest::Owned<CsmExporter> pExporter(CsmExporter::createInstance());
   EXPECT_EQ(pExporter->getDesiredUpAxisAsString(), "Y");
   EXPECT_FALSE(pExporter->setDesiredUpAxis("x"));
   EXPECT_EQ(pExporter->getDesiredUpAxis(), EUpAxisY);

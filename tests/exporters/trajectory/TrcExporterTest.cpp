@@ -11,19 +11,6 @@
 using namespace HostTest;
 
 namespace {
-struct TrcDeleter {
-  void operator()(TrcExporter* p) const { p->deleteThis(); }
-};
-using TrcPtr = std::unique_ptr<TrcExporter, TrcDeleter>;
-
-std::vector<std::string> lines(const std::string& i_rText) {
-  std::vector<std::string> result;
-  std::istringstream in(i_rText);
-  for (std::string line; std::getline(in, line);)
-    result.push_back(line);
-  return result;
-}
-
 class TrcExport : public ::testing::Test {
 protected:
   void SetUp() override {
@@ -32,7 +19,7 @@ protected:
     m_path = ExportTest::tempPath("take.trc");
   }
   std::string run() { return ExportTest::exportText(*m_pExporter, m_path); }
-  TrcPtr m_pExporter;
+  ExportTest::Owned<TrcExporter> m_pExporter;
   std::string m_path;
 };
 } // namespace
@@ -80,7 +67,7 @@ TEST_F(TrcExport, NamesUnderEachFlagCombination) {
 
 TEST_F(TrcExport, NoMarkersAndBackwardRange) {
   g_db->addToScene(new Node("notAMarker"), false, nullptr, false, false);
-  std::vector<std::string> text = lines(run());
+  std::vector<std::string> text = ExportTest::lines(run());
   ASSERT_EQ(text.size(), 8u);
   EXPECT_EQ(text[3], "Frame#\tTime\t");
   EXPECT_EQ(text[4], "\t\t");
@@ -93,7 +80,7 @@ TEST_F(TrcExport, NoMarkersAndBackwardRange) {
   request.range = HTimeRange(5 * tpf, 2 * tpf);
   std::string error;
   ASSERT_EQ(AnvilCore::runExport(*m_pExporter, request, error), AnvilCore::EExportStatus::EOk);
-  text = lines(ExportTest::readText(m_path));
+  text = ExportTest::lines(ExportTest::readText(m_path));
   ASSERT_EQ(text.size(), 5u);
   EXPECT_EQ(text[2], "100.000000\t100.000000\t-2\t0\tmm\t100.000000\t1\t-2");
 }
@@ -109,7 +96,7 @@ TEST_F(TrcExport, TimeColumnIsAbsoluteAndReset) {
   ASSERT_EQ(AnvilCore::runExport(*m_pExporter, request, error), AnvilCore::EExportStatus::EOk);
   // A second export through the same object must not repeat the first one's markers.
   ASSERT_EQ(AnvilCore::runExport(*m_pExporter, request, error), AnvilCore::EExportStatus::EOk);
-  const std::vector<std::string> text = lines(ExportTest::readText(m_path));
+  const std::vector<std::string> text = ExportTest::lines(ExportTest::readText(m_path));
   ASSERT_EQ(text.size(), 7u);
   EXPECT_EQ(text[4], "\t\tX0\tY0\tZ0\t");
   EXPECT_EQ(text[5], "30\t0.300000\t1.000000\t1.000000\t1.000000");
