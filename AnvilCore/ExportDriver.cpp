@@ -1,4 +1,5 @@
 #include "ExportDriver.h"
+#include "Utils/UtilsFileSystem/ReplacingFile.h"
 #include "plugin/host/AudioSource.h"
 #include "plugin/host/Character.h"
 #include "plugin/host/Database.h"
@@ -8,11 +9,8 @@
 #include "plugin/host/OperationStack.h"
 #include "plugin/host/OpticalCamera.h"
 #include "plugin/host/VideoCamera.h"
-#include <cerrno>
 #include <cstdio>
-#include <cstring>
 #include <filesystem>
-#include <unistd.h>
 
 namespace AnvilCore {
 
@@ -33,26 +31,17 @@ bool selectedOrUnderSelection(const Module* i_pModule) {
   return false;
 }
 
-std::string temporarySibling(const std::string& i_path) {
-  const std::filesystem::path path(i_path);
-  return (path.parent_path() /
-          ("." + path.filename().string() + ".anvil-" + std::to_string(::getpid()) + ".tmp"))
-      .string();
-}
 } // namespace
 
 EExportStatus runExport(FileExporter& i_rExporter, const ExportRequest& i_rRequest,
                         std::string& o_rError) {
-  const std::string temp = temporarySibling(i_rRequest.path);
-  // Probe that the output's folder takes a new file before the exporter runs.
-  if (FILE* pProbe = std::fopen(temp.c_str(), "wb")) {
-    std::fclose(pProbe);
-  } else {
-    o_rError = "cannot create '" + i_rRequest.path + "': " + std::strerror(errno);
+  // The stream goes to a temporary sibling that replaces the output only when all went well.
+  UtilsFileSystem::VReplacingFile output;
+  if (output.Open(i_rRequest.path).IsFailure()) {
+    o_rError = "cannot create '" + i_rRequest.path + "': " + output.Reason();
     return EExportStatus::ECannotOpen;
   }
-
-  FILE* pStream = i_rExporter.openFile(HString(temp), i_rExporter.isBinary());
+  FILE* pStream = output.File();
   i_rExporter.setStream(pStream);
   i_rExporter.setFilePath(HString(i_rRequest.path));
 
@@ -71,34 +60,27 @@ EExportStatus runExport(FileExporter& i_rExporter, const ExportRequest& i_rReque
 
   g_theOperationStack.setLabel(HString(std::filesystem::path(i_rRequest.path).filename().string()));
   i_rExporter.reset();
-  bool ok = i_rExporter.write();
+  UtilsFileSystem::ClearLastReplaceFailure();
+  const bool ok = i_rExporter.write();
   g_theOperationStack.endTask();
-
-  long written = 0;
-  bool streamFailed = false;
-  if (pStream) {
-    streamFailed = std::fflush(pStream) != 0 || std::ferror(pStream);
-    written = std::ftell(pStream);
-  }
-  i_rExporter.closeFile(pStream);
   i_rExporter.setStream(nullptr);
 
-  std::error_code ec;
-  if (!ok || streamFailed) {
-    std::filesystem::remove(temp, ec);
-    if (streamFailed) o_rError = "error writing '" + i_rRequest.path + "'";
+  if (!ok) {
+    output.Abandon();
+    // An exporter that writes by path may fail quietly; the file layer knows why.
+    const UtilsFileSystem::VReplaceFailure& failure = UtilsFileSystem::LastReplaceFailure();
+    if (!failure.m_Reason.empty())
+      o_rError = "error writing '" + failure.m_Target + "': " + failure.m_Reason;
     return EExportStatus::EWriteFailed;
   }
   // A stream left empty means the exporter wrote the output path by its own means.
-  if (written > 0) {
-    std::filesystem::rename(temp, i_rRequest.path, ec);
-    if (ec) {
-      o_rError = "cannot replace '" + i_rRequest.path + "': " + ec.message();
-      std::filesystem::remove(temp, ec);
-      return EExportStatus::ECannotOpen;
-    }
-  } else {
-    std::filesystem::remove(temp, ec);
+  if (output.Size() == 0 && !std::ferror(pStream)) {
+    output.Abandon();
+    return EExportStatus::EOk;
+  }
+  if (output.Commit().IsFailure()) {
+    o_rError = "error writing '" + i_rRequest.path + "': " + output.Reason();
+    return EExportStatus::EWriteFailed;
   }
   return EExportStatus::EOk;
 }

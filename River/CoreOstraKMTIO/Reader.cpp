@@ -3,8 +3,8 @@
 #include "DebugServices/GlobalLog.h"
 #include "River/CoreOstraKMTIO/Declaration.h"
 #include "River/CoreOstraKMTIO/ReaderPasses.h"
-#include "Utils/UtilsFileSystem/FileIO.h"
 #include "Utils/UtilsFileSystem/FileStreams.h"
+#include "Utils/UtilsFileSystem/ReplacingFile.h"
 #include "Utils/UtilsRapidXml/VReaderNode.h"
 #include "Utils/UtilsRapidXml/VSchemaNode.h"
 
@@ -160,14 +160,16 @@ std::string VReader::SchemaText() {
 
 bool VReader::WriteSchema(const boost::filesystem::path& fileName) const {
   const std::string text = SchemaText();
-  auto [pFile, result] = UtilsFileSystem::OpenOutputFile(fileName, true);
-  if (result.IsFailure()) {
-    ZMT_LOG("KMTIO", ZMT::ELogError, "Error opening file '%1%' for writing", fileName.string());
+  UtilsFileSystem::VReplacingFile file;
+  if (file.Open(fileName).IsFailure()) {
+    ZMT_LOG("KMTIO", ZMT::ELogError, "Error opening file '%1%' for writing: %2%", fileName.string(),
+            file.Reason());
     return false;
   }
-  UtilsFileSystem::VFileOutputStream stream(pFile);
-  if (!stream.Write(text.data(), text.size()) || stream.Close().IsFailure()) {
-    ZMT_LOG("KMTIO", ZMT::ELogError, "Failed to write file");
+  file.Write(text.data(), text.size());
+  if (file.Commit().IsFailure()) {
+    ZMT_LOG("KMTIO", ZMT::ELogError, "Failed to write file '%1%': %2%", fileName.string(),
+            file.Reason());
     return false;
   }
   return true;

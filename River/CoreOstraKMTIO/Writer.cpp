@@ -5,8 +5,7 @@
 #include "River/CoreOstraKMTIO/PostTransform.h"
 #include "River/CoreOstraKMTIO/WriterElements.h"
 #include "River/CoreOstraTypesUtils/JointAxes.h"
-#include "Utils/UtilsFileSystem/FileIO.h"
-#include "Utils/UtilsFileSystem/FileStreams.h"
+#include "Utils/UtilsFileSystem/ReplacingFile.h"
 #include "Utils/UtilsRapidXml/XmlBuild.h"
 
 #include <rapidxml/rapidxml.hpp>
@@ -141,17 +140,18 @@ std::uint32_t VWriter::Write(const boost::filesystem::path& fileName,
                              const VSubjectDynamicSubspace& subspace, int versionCode) {
   std::string text;
   if (!Build(text, subject, appData, subspace, versionCode)) return ResultFailed;
-  auto [pFile, result] = UtilsFileSystem::OpenOutputFile(fileName, true);
-  if (result.IsFailure()) {
-    m_Messages.push_back(
-        ZMT::FormatOrRaw("Error opening file '%1%' for writing", fileName.string()));
+  // The old file stays as it was unless every byte reaches the disk.
+  UtilsFileSystem::VReplacingFile file;
+  if (file.Open(fileName).IsFailure()) {
+    m_Messages.push_back(ZMT::FormatOrRaw("Error opening file '%1%' for writing: %2%",
+                                          fileName.string(), file.Reason()));
     return ResultFailed;
   }
-  UtilsFileSystem::VFileOutputStream stream(pFile);
-  if (!stream.Write(text.data(), text.size()) || stream.Close().IsFailure()) {
-    m_Messages.push_back("Failed to write file");
-    stream.Close();
-    UtilsFileSystem::RemoveFile(fileName);
+  // A failed write leaves its reason for the commit, which then fails and cleans up.
+  file.Write(text.data(), text.size());
+  if (file.Commit().IsFailure()) {
+    m_Messages.push_back(
+        ZMT::FormatOrRaw("Failed to write file '%1%': %2%", fileName.string(), file.Reason()));
     return ResultFailed;
   }
   return ResultOk;

@@ -36,7 +36,13 @@ ZMT::IResult OpenFailure(const boost::filesystem::path& path, int error, const c
   const ZMT::IResult result = FailureOf(error);
   if (result == ZMT::IResult::NotPermitted) {
     const std::string lockers = JoinedLockers(path);
-    if (!lockers.empty()) FILE_LOG(ZMT::ELogError, lockedFormat, path, lockers);
+    if (!lockers.empty())
+      FILE_LOG(ZMT::ELogError, lockedFormat, path, lockers);
+    else
+      FILE_LOG(ZMT::ELogError,
+               "Permission denied for %1%: the mode or owner of the file or its "
+               "folder does not allow it.",
+               path);
   }
   return result;
 }

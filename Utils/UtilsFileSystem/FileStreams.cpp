@@ -22,9 +22,8 @@ bool VFileOutputStream::Write(const void* pBuffer, std::uint64_t size) {
 
 ZMT::IResult VFileOutputStream::Close() {
   if (!m_pFile) return ZMT::IResult::InvalidArgument;
-  const ZMT::IResult result = CloseFile(m_pFile);
-  if (result.IsSuccess()) m_pFile = nullptr;
-  return result;
+  // fclose releases the stream even when its final flush fails: never close it twice.
+  return CloseFile(std::exchange(m_pFile, nullptr));
 }
 
 VFileInputStream::~VFileInputStream() {
@@ -46,9 +45,7 @@ bool VFileInputStream::Read(void* pBuffer, std::uint64_t size) {
 
 ZMT::IResult VFileInputStream::Close() {
   if (!m_pFile) return ZMT::IResult::InvalidArgument;
-  const ZMT::IResult result = CloseFile(m_pFile);
-  if (result.IsSuccess()) m_pFile = nullptr;
-  return result;
+  return CloseFile(std::exchange(m_pFile, nullptr));
 }
 
 bool VFileSeekable::GetSize(std::uint64_t& o_rSize) {

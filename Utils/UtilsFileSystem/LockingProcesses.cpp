@@ -6,7 +6,6 @@
 #include <set>
 
 #if defined(__linux__)
-#include <dirent.h>
 #include <sys/stat.h>
 #include <sys/sysmacros.h>
 #include <unistd.h>
@@ -36,37 +35,6 @@ template <class T> bool ParseNumber(std::string_view text, T& o_rValue, int base
 }
 
 #if defined(__linux__)
-
-/// Whether `pid` (a /proc entry name) has a descriptor open on the file (device, inode).
-bool HoldsOpen(const std::string& pid, dev_t device, ino_t inode) {
-  const std::string fdDir = "/proc/" + pid + "/fd";
-  DIR* pDir = opendir(fdDir.c_str());
-  if (!pDir) return false;
-  bool found = false;
-  while (dirent* pEntry = readdir(pDir)) {
-    if (pEntry->d_name[0] == '.') continue;
-    struct stat status {};
-    const std::string link = fdDir + "/" + pEntry->d_name;
-    if (stat(link.c_str(), &status) == 0 && status.st_dev == device && status.st_ino == inode) {
-      found = true;
-      break;
-    }
-  }
-  closedir(pDir);
-  return found;
-}
-
-void AddOpenHolders(dev_t device, ino_t inode, std::set<pid_t>& io_rPids) {
-  DIR* pProc = opendir("/proc");
-  if (!pProc) return;
-  while (dirent* pEntry = readdir(pProc)) {
-    pid_t pid = 0;
-    const std::string name = pEntry->d_name;
-    if (!ParseNumber(std::string_view(name), pid, 10)) continue;
-    if (HoldsOpen(name, device, inode)) io_rPids.insert(pid);
-  }
-  closedir(pProc);
-}
 
 void AddLockHolders(dev_t device, ino_t inode, std::set<pid_t>& io_rPids) {
   std::ifstream locks("/proc/locks");
@@ -115,8 +83,8 @@ bool FindLockingProcesses(const boost::filesystem::path& path, std::vector<std::
 #if defined(__linux__)
   struct stat status {};
   if (stat(path.c_str(), &status) != 0) return false;
+  // Only a lock holds a file here: an open descriptor alone refuses nobody.
   std::set<pid_t> pids;
-  AddOpenHolders(status.st_dev, status.st_ino, pids);
   AddLockHolders(status.st_dev, status.st_ino, pids);
   if (pids.size() > MaxLockingProcesses) return false;
   for (pid_t pid : pids)

@@ -1,6 +1,7 @@
 #pragma once
-// Which processes hold a file: on Linux those with the file open (/proc/*/fd) and those holding
-// advisory locks on it (/proc/locks), named by their executable path.
+// Which processes hold a file: on Linux those holding a lock on it (flock, fcntl or a lease, as
+// /proc/locks lists them), named by their executable path. A process that merely has the file
+// open holds nothing: Linux refuses an open for the file's mode or owner, never for a reader.
 
 #include <boost/filesystem/path.hpp>
 

@@ -27,16 +27,10 @@ struct ParsedSource {
 };
 } // namespace
 
-void registerModuleCommands(const LoadedModule& i_rModule,
-                            AnvilCore::CommandRegistry& io_rRegistry) {
-  if (i_rModule.commandPlugin()) io_rRegistry.addLoaded(*i_rModule.commandPlugin());
-}
-
-int runExportCommands(const LoadedModule& i_rModule, const std::vector<std::string>& i_rScripts,
+int runExportCommands(LoadedModule& i_rModule, const std::vector<std::string>& i_rScripts,
                       const std::vector<std::string>& i_rLines) {
   if (i_rScripts.empty() && i_rLines.empty()) return EExitOk;
-  AnvilCore::CommandRegistry registry;
-  registerModuleCommands(i_rModule, registry);
+  const AnvilCore::CommandRegistry& registry = i_rModule.commands();
 
   std::vector<ParsedSource> sources;
   AnvilCore::ScriptError error;
@@ -86,9 +80,7 @@ int runCommandsListing(const std::string& i_rModulePath) {
     printError(message);
     return EExitUsage;
   }
-  AnvilCore::CommandRegistry registry;
-  registerModuleCommands(module, registry);
-  for (const Command* pCommand : registry.commands()) {
+  for (const Command* pCommand : module.commands().commands()) {
     std::printf("%s\t%s\n", pCommand->getName().GetStr(), pCommand->getDescription().GetStr());
     for (int id = 0; id < pCommand->getNumOptions(); ++id) {
       if (pCommand->isOptionHidden(id)) continue;

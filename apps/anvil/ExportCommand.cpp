@@ -70,7 +70,8 @@ int runExport(const CommonArgs& i_rCommon, const ExportArgs& i_rArgs) {
     }
     exporters.push_back(pExporter);
   }
-  // Options persist from one run to the next; script commands change them after this.
+  // Options start from the user setup; script commands change them for this run only, unless
+  // --save-setup asks to keep them.
   for (int i = 0; i < pMgr->getNumExporters(); ++i)
     pMgr->getExporterAt(i)->loadUserSetup();
   if (const int code = runExportCommands(module, i_rArgs.scripts, i_rArgs.commandLines);
@@ -106,7 +107,7 @@ int runExport(const CommonArgs& i_rCommon, const ExportArgs& i_rArgs) {
                              : error + "; nothing written");
     exitCode = EExitWriteFailed;
   }
-  if (!g_interface.save(error)) g_db->logWarning("%s", error.c_str());
+  if (i_rArgs.saveSetup && !g_interface.save(error)) g_db->logWarning("%s", error.c_str());
   return exitCode;
 }
 

@@ -77,12 +77,13 @@ bool LoadedModule::load(const std::string& i_path, std::string& o_rError) {
   FileExporterMgr* pMgr = g_db->getFileExporterMgr();
   for (int i = 0; i < m_pExporters->getNumExporters(); ++i)
     pMgr->registerExporter(m_pExporters->getExporter(i));
-  if (m_pCommands) m_pCommands->loadCommands();
+  if (m_pCommands) m_commands.addFromPlugin(*m_pCommands);
   return true;
 }
 
 LoadedModule::~LoadedModule() {
   g_db->getFileExporterMgr()->clear();
+  m_commands.clear();
   if (m_pExporters) m_pExporters->deleteThis();
   if (m_pCommands) m_pCommands->deleteThis();
   // The module stays mapped until exit: objects it made may still be referenced by the host.

@@ -1,4 +1,5 @@
 #pragma once
+#include "AnvilCore/commands/CommandRegistry.h"
 #include <string>
 
 class CommandPluginBase;
@@ -6,8 +7,9 @@ class ExporterPluginBase;
 
 namespace anvil {
 
-/// The export module, loaded with dlopen, with both plug-ins taken and their exporters handed to
-/// the host's `FileExporterMgr`.
+/// The export module, loaded with dlopen, with both plug-ins taken, their exporters handed to the
+/// host's `FileExporterMgr` and their commands to a registry. The host owns what the plug-ins
+/// hand it, and releases all of it before the module's code could go.
 class LoadedModule {
 public:
   LoadedModule() = default;
@@ -21,6 +23,8 @@ public:
   bool load(const std::string& i_path, std::string& o_rError);
   ExporterPluginBase* exporterPlugin() const { return m_pExporters; }
   CommandPluginBase* commandPlugin() const { return m_pCommands; }
+  /// The module's commands, owned here.
+  AnvilCore::CommandRegistry& commands() { return m_commands; }
   const std::string& path() const { return m_path; }
 
   /// Where the module is looked for when no path is given.
@@ -30,6 +34,7 @@ private:
   void* m_pHandle = nullptr;
   ExporterPluginBase* m_pExporters = nullptr;
   CommandPluginBase* m_pCommands = nullptr;
+  AnvilCore::CommandRegistry m_commands;
   std::string m_path;
 };
 

@@ -19,6 +19,7 @@ struct ExportArgs {
   std::vector<std::string> outputs;
   std::string range; ///< "FIRST:LAST" in frames, or empty for the animation range
   bool selectedOnly = false;
+  bool saveSetup = false;                ///< --save-setup: options of this run persist
   std::vector<std::string> scripts;      ///< --script files of option commands
   std::vector<std::string> commandLines; ///< -c option command lines
 };

@@ -32,6 +32,8 @@ int main(int argc, char** argv) {
       ->allow_extra_args(false);
   pExport->add_option("--module", common.modulePath, "Path of libAnvilFileExport.so");
   pExport->add_option("--user-setup", common.userSetupPath, "User setup file");
+  pExport->add_flag("--save-setup", exportArgs.saveSetup,
+                    "Keep the options of this run in the user setup file for later runs");
 
   bool extensionsOnly = false;
   CLI::App* pFormats = app.add_subcommand("formats", "List the registered exporters");

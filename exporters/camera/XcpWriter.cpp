@@ -1,7 +1,7 @@
 #include "XcpWriter.h"
 #include "DebugServices/AssertFail.h"
+#include "Utils/UtilsFileSystem/ReplacingFile.h"
 #include "XcpText.h"
-#include <boost/filesystem/fstream.hpp>
 #include <climits>
 #include <cstdlib>
 #include <iterator>
@@ -167,9 +167,9 @@ std::string XcpWriter::toString() const {
 
 bool XcpWriter::save(const std::string& i_rPath) const {
   if (!m_pDocumentInfo) return false;
-  boost::filesystem::ofstream stream{boost::filesystem::path(i_rPath)};
-  if (!stream) return false;
-  rapidxml::print(std::ostream_iterator<char>(stream), *m_pDocumentInfo, 0);
-  stream.flush();
-  return static_cast<bool>(stream);
+  UtilsFileSystem::VReplacingFile file;
+  if (file.Open(i_rPath).IsFailure()) return false;
+  const std::string text = toString();
+  file.Write(text.data(), text.size());
+  return file.Commit().IsSuccess();
 }

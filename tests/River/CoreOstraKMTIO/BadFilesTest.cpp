@@ -207,9 +207,10 @@ TEST(KmtBadSubjects, WriterReportsEveryFaultAndLeavesTheFileAlone) {
   EXPECT_EQ(Write(scratch / "no" / "dir.kmt", rich.m_Subject, rich.m_AppData, rich.m_Subspace,
                   &messages, 16),
             ResultFailed);
-  EXPECT_EQ(messages,
-            std::vector<std::string>{"Error opening file '" +
-                                     (scratch / "no" / "dir.kmt").string() + "' for writing"});
+  EXPECT_EQ(messages, std::vector<std::string>{"Error opening file '" +
+                                               (scratch / "no" / "dir.kmt").string() +
+                                               "' for writing: the folder '" +
+                                               (scratch / "no").string() + "' does not exist"});
 }
 
 TEST(KmtSchema, IsAValidSchemaThatDeclaresEveryElementOnce) {

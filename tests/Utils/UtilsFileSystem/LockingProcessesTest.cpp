@@ -2,6 +2,7 @@
 
 #include "Utils/UtilsFileSystem/LockingProcesses.h"
 #include "Utils/UtilsFileSystem/FileIO.h"
+#include "Utils/UtilsFileSystem/ReplacingFile.h"
 
 #include "DebugServices/LogCapture.h"
 #include "TempDir.h"
@@ -85,6 +86,27 @@ bool DropFileModeOverride() {
   return syscall(SYS_capset, &header, data) == 0;
 }
 
+/// Runs `body` in a child that can't override file modes and returns what it printed.
+template <class TBody> std::string InUnprivilegedChild(TBody body) {
+  int report[2];
+  if (pipe(report) != 0) return {};
+  const pid_t pid = fork();
+  if (pid == 0) {
+    close(report[0]);
+    const std::string text = DropFileModeOverride() ? body() : std::string();
+    (void)!write(report[1], text.data(), text.size());
+    _exit(0);
+  }
+  close(report[1]);
+  std::string text;
+  char buffer[512];
+  for (ssize_t n; (n = read(report[0], buffer, sizeof buffer)) > 0;)
+    text.append(buffer, static_cast<std::size_t>(n));
+  close(report[0]);
+  waitpid(pid, nullptr, 0);
+  return text;
+}
+
 boost::filesystem::path MakeFile(const VTempDir& dir, const std::string& name) {
   const auto path = dir / name;
   std::ofstream(path.string()) << "held";
@@ -145,35 +167,59 @@ TEST(LockingProcesses, RefusedOpenNamesTheHolders) {
   VHolders holders;
   holders.Start(path, ELock::EFcntl);
 
-  // The open runs in a child that can't override file modes; it reports back through a pipe.
-  int report[2];
-  ASSERT_EQ(pipe(report), 0);
-  const pid_t pid = fork();
-  ASSERT_GE(pid, 0);
-  if (pid == 0) {
-    close(report[0]);
-    std::string text;
-    if (DropFileModeOverride()) {
-      ZMT::VLogCapture capture;
-      auto [pFile, result] = OpenOutputFile(path, true);
-      text = std::to_string(result.Code()) + "\n";
-      for (const auto& message : capture.Messages("System"))
-        text += message + "\n";
-    }
-    (void)!write(report[1], text.data(), text.size());
-    _exit(0);
-  }
-  close(report[1]);
-  std::string text;
-  char buffer[512];
-  for (ssize_t n; (n = read(report[0], buffer, sizeof buffer)) > 0;)
-    text.append(buffer, static_cast<std::size_t>(n));
-  close(report[0]);
-  waitpid(pid, nullptr, 0);
+  // The open runs in a child that can't override file modes.
+  const std::string text = InUnprivilegedChild([&] {
+    ZMT::VLogCapture capture;
+    auto [pFile, result] = OpenOutputFile(path, true);
+    std::string lines = std::to_string(result.Code()) + "\n";
+    for (const auto& message : capture.Messages("System"))
+      lines += message + "\n";
+    return lines;
+  });
   ASSERT_FALSE(text.empty()) << "capabilities could not be dropped";
 
   const std::string expected = std::to_string(ZMT::IResult::NotPermitted) + "\n" +
                                "Failed to open output file \"" + path.string() +
                                "\" locked by processes '" + OwnExecutable() + "'.\n";
   EXPECT_EQ(text, expected);
+}
+
+TEST(LockingProcesses, AReadOnlyFileIsBlamedOnItsModeAndOnlyLockHoldersAreNamed) {
+  VTempDir dir;
+  const auto path = MakeFile(dir, "readonly.kmt");
+  ASSERT_EQ(chmod(path.c_str(), 0444), 0);
+  auto replace = [&] {
+    VReplacingFile file;
+    const ZMT::IResult result = file.Open(path);
+    return std::to_string(result.Code()) + ": " + file.Reason();
+  };
+  const std::string prefix = std::to_string(ZMT::IResult::NotPermitted) + ": ";
+
+  // A process that merely has the file open holds nothing.
+  const int reader = open(path.c_str(), O_RDONLY);
+  ASSERT_GE(reader, 0);
+  std::string text = InUnprivilegedChild(replace);
+  close(reader);
+  ASSERT_FALSE(text.empty()) << "capabilities could not be dropped";
+  EXPECT_EQ(text, prefix + "permission denied by the file's mode or owner");
+
+  VHolders holders;
+  holders.Start(path, ELock::EFlock);
+  text = InUnprivilegedChild(replace);
+  EXPECT_EQ(text, prefix + "permission denied by the file's mode or owner; locked by processes '" +
+                      OwnExecutable() + "'");
+
+  // The plain open says the same in the log when nobody holds a lock.
+  const auto free = MakeFile(dir, "free.kmt");
+  ASSERT_EQ(chmod(free.c_str(), 0444), 0);
+  text = InUnprivilegedChild([&] {
+    ZMT::VLogCapture capture;
+    OpenOutputFile(free, true);
+    std::string lines;
+    for (const auto& message : capture.Messages("System"))
+      lines += message + "\n";
+    return lines;
+  });
+  EXPECT_EQ(text, "Permission denied for \"" + free.string() +
+                      "\": the mode or owner of the file or its folder does not allow it.\n");
 }

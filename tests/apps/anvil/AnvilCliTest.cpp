@@ -60,8 +60,8 @@ TEST_F(AnvilCli, ExportsTheDemoToTrc) {
   EXPECT_EQ(line(path("demo.trc"), 0), "PathFileType\t4\t(X/Y/Z)\t" + path("demo.trc"));
   EXPECT_EQ(line(path("demo.trc"), 2), "120.000000\t120.000000\t1200\t44\tmm\t120.000000\t1\t1200");
   EXPECT_EQ(line(path("demo.trc"), 5).rfind("0\t0.000000\t", 0), 0u);
-  // The options were stored for the next run.
-  EXPECT_TRUE(fs::exists(path("setup.ini")));
+  // A plain run leaves the user setup file alone.
+  EXPECT_FALSE(fs::exists(path("setup.ini")));
 
   const CliRun ranged = anvil("export demo --range 10:19 -o " + path("part.trc"));
   ASSERT_EQ(ranged.code, 0) << ranged.output;

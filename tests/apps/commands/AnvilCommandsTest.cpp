@@ -80,6 +80,31 @@ TEST_F(AnvilCommands, CommandsSetTheExportersOptions) {
   EXPECT_NE(m_output.find("animation range: 1..450"), std::string::npos) << m_output;
 }
 
+TEST_F(AnvilCommands, CommandLineOptionsLastOneRunUnlessSaved) {
+  const std::string input = sample("Eb015vr.c3d");
+  auto isFloat = [&](const std::string& i_name) {
+    std::ifstream in(path(i_name), std::ios::binary);
+    const std::vector<uint8_t> bytes{std::istreambuf_iterator<char>(in), {}};
+    AnvilCore::C3DContent content;
+    std::string error;
+    EXPECT_TRUE(AnvilCore::parseC3D(bytes.data(), bytes.size(), content, error)) << error;
+    return content.scale < 0.0f;
+  };
+  ASSERT_EQ(run("export " + input + " -o " + path("a.c3d") + " -c 'c3dExportOptions -real false'"),
+            0)
+      << m_output;
+  EXPECT_FALSE(isFloat("a.c3d"));
+  ASSERT_EQ(run("export " + input + " -o " + path("b.c3d")), 0) << m_output;
+  EXPECT_TRUE(isFloat("b.c3d")) << "a -c option of an earlier run leaked into this one";
+
+  ASSERT_EQ(run("export " + input + " -o " + path("c.c3d") +
+                " --save-setup -c 'c3dExportOptions -real false'"),
+            0)
+      << m_output;
+  ASSERT_EQ(run("export " + input + " -o " + path("d.c3d")), 0) << m_output;
+  EXPECT_FALSE(isFloat("d.c3d")) << "--save-setup should keep the option";
+}
+
 TEST_F(AnvilCommands, ABadCommandLineExportsNothing) {
   const std::string input = sample("Eb015pi.c3d");
   EXPECT_EQ(run("export " + input + " -o " + path("a.trc") +

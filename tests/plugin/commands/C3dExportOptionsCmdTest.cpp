@@ -24,20 +24,6 @@ TEST_F(C3dExportOptionsCmdTest, DeclaresItsOptionsInOrder) {
                      {"upAxis", Variable::EString}});
 }
 
-TEST_F(C3dExportOptionsCmdTest, CommandsComeInTheHostsOrder) {
-  AnvilFileExporterCommandsPlugin* pPlugin = AnvilFileExporterCommandsPlugin::createInstance();
-  ASSERT_TRUE(pPlugin->loadCommands());
-  ASSERT_GE(pPlugin->getNumCommands(), 2);
-  EXPECT_EQ(pPlugin->getCommand(0)->getName(), "c3dExportOptions");
-  int trc = -1;
-  for (int i = 0; i < pPlugin->getNumCommands(); ++i)
-    if (pPlugin->getCommand(i)->getName() == "trcExportOptions") trc = i;
-  EXPECT_GT(trc, 0);
-  for (int i = 0; i < pPlugin->getNumCommands(); ++i)
-    pPlugin->getCommand(i)->unref();
-  pPlugin->deleteThis();
-}
-
 TEST_F(C3dExportOptionsCmdTest, SetsEveryOption) {
   EXPECT_TRUE(run("c3dExportOptions -preserveGaps false -collapseSubjects off -real 0 "
                   "-writeTimeCode false -writeUnlabeled false -removeLeadingUnderscore true "

@@ -25,28 +25,13 @@ protected:
   KmrExporter* m_pKmr = nullptr;
 };
 
-TEST_F(SubjectExportOptionsCmdTest, DeclaresTheirOptionsAndComeAfterTrcInTheHostsOrder) {
+TEST_F(SubjectExportOptionsCmdTest, DeclaresTheirOptions) {
   expectDeclaration("kmtExportOptions", "Set Kmt Export Options", {{"version", Variable::EString}});
   expectDeclaration("kmfExportOptions", "Set Kmf Export Options", {{"version", Variable::EString}});
   expectDeclaration("kmsExportOptions", "Set Kms Export Options",
                     {{"version", Variable::EString}, {"retargetPose", Variable::EBool}});
   expectDeclaration("kmrExportOptions", "Set Kmr Export Options",
                     {{"version", Variable::EString}, {"retargetPose", Variable::EBool}});
-  AnvilFileExporterCommandsPlugin* pPlugin = AnvilFileExporterCommandsPlugin::createInstance();
-  ASSERT_TRUE(pPlugin->loadCommands());
-  std::vector<std::string> names;
-  for (int i = 0; i < pPlugin->getNumCommands(); ++i) {
-    names.push_back(pPlugin->getCommand(i)->getName().GetStr());
-    pPlugin->getCommand(i)->unref();
-  }
-  pPlugin->deleteThis();
-  auto trc = std::find(names.begin(), names.end(), "trcExportOptions");
-  ASSERT_NE(trc, names.end());
-  const std::vector<std::string> expected = {"trcExportOptions", "kmtExportOptions",
-                                             "kmfExportOptions", "kmsExportOptions",
-                                             "kmrExportOptions"};
-  ASSERT_GE(names.end() - trc, 5);
-  EXPECT_EQ(std::vector<std::string>(trc, trc + 5), expected);
 }
 
 TEST_F(SubjectExportOptionsCmdTest, VersionsGoThroughTheExportersSetter) {
