@@ -5,6 +5,7 @@
 #include "commands/KmsExportOptionsCmd.h"
 #include "commands/KmtExportOptionsCmd.h"
 #include "commands/TrcExportOptionsCmd.h"
+#include "commands/UsdExportOptionsCmd.h"
 #include <new>
 
 AnvilFileExporterCommandsPlugin* AnvilFileExporterCommandsPlugin::createInstance() {
@@ -20,5 +21,6 @@ bool AnvilFileExporterCommandsPlugin::loadCommands() {
   m_commands.add(new (std::nothrow) KmfExportOptionsCmd());
   m_commands.add(new (std::nothrow) KmsExportOptionsCmd());
   m_commands.add(new (std::nothrow) KmrExportOptionsCmd());
+  m_commands.add(new (std::nothrow) UsdExportOptionsCmd());
   return true;
 }

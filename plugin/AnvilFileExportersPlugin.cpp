@@ -1,5 +1,6 @@
 #include "AnvilFileExportersPlugin.h"
 #include "exporters/camera/XCPExporter.h"
+#include "exporters/scene/USDExporter.h"
 #include "exporters/subject/KmfExporter.h"
 #include "exporters/subject/KmrExporter.h"
 #include "exporters/subject/KmsExporter.h"
@@ -22,5 +23,6 @@ bool AnvilFileExportersPlugin::loadExporters() {
   m_exporters.add(KmsExporter::createInstance());
   m_exporters.add(KmrExporter::createInstance());
   m_exporters.add(XCPExporter::createInstance());
+  m_exporters.add(USDExporter::createInstance());
   return true;
 }
