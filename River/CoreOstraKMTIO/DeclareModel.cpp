@@ -156,6 +156,7 @@ void DeclareKinematicModel(INode& node, VReadContext& context) {
                "Whether this KMT version is still in development.", XsdString, false)) {
     node.Error("Attempting to load a KMT version which was saved while in development.");
     context.m_Refused = true;
+    node.Abandon();
     return;
   }
   if (version < context.m_MinVersion) {
@@ -163,6 +164,7 @@ void DeclareKinematicModel(INode& node, VReadContext& context) {
         ZMT::FormatOrRaw("Cannot load KMT file with version %1%, minimum supported version is %2%",
                          version.ToString(), context.m_MinVersion.ToString()));
     context.m_Refused = true;
+    node.Abandon();
     return;
   }
   if (version > context.m_MaxVersion) {
@@ -170,6 +172,7 @@ void DeclareKinematicModel(INode& node, VReadContext& context) {
         ZMT::FormatOrRaw("Cannot load KMT file with version %1%, maximum supported version is %2%",
                          version.ToString(), context.m_MaxVersion.ToString()));
     context.m_Refused = true;
+    node.Abandon();
     return;
   }
 

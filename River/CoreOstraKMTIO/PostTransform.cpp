@@ -1,6 +1,7 @@
 #include "River/CoreOstraKMTIO/PostTransform.h"
 
 #include "River/CoreOstraTypesUtils/AngleAxis.h"
+#include "River/CoreOstraTypesUtils/DecimalRounding.h"
 #include "River/CoreOstraTypesUtils/ExpressionNumber.h"
 
 namespace CoreOstraKMTIO {
@@ -13,8 +14,18 @@ void PostTextsFromInverse(const IVersion& version, const std::array<double, 3>& 
                           std::array<std::string, 3>& o_rTranslation) {
   std::array<double, 3> rotation = inverseRotation, translation = inverseTranslation;
   if (version < Versions::V3_0) {
-    CoreOstraTypesUtils::InvertAngleAxisPose(inverseRotation, inverseTranslation, rotation,
-                                             translation);
+    using CoreOstraTypesUtils::InvertAngleAxisPose;
+    InvertAngleAxisPose(inverseRotation, inverseTranslation, rotation, translation);
+    // The rotation inverts exactly; the translation takes rounding. Rounded, it is written as
+    // read whenever reading it gives the record's values again.
+    const std::array<double, 3> raw = translation;
+    translation = CoreOstraTypesUtils::PreferReproducing(
+        raw, CoreOstraTypesUtils::RoundedToDecimals(raw),
+        [&](const std::array<double, 3>& candidate) {
+          std::array<double, 3> backRotation{}, backTranslation{};
+          InvertAngleAxisPose(rotation, candidate, backRotation, backTranslation);
+          return backTranslation == inverseTranslation;
+        });
   }
   for (std::size_t i = 0; i < 3; ++i) {
     o_rRotation[i] = FormatExpressionNumber(rotation[i]);

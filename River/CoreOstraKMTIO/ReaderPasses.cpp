@@ -28,6 +28,12 @@ bool EvaluateGiven(VDynamicExpressionParserSimple& parser, const std::array<std:
   return ok;
 }
 
+/// A post half the file left out is no transform, as a missing pre transform is.
+std::array<std::string, 3> ZeroIfAbsent(const std::array<std::string, 3>& texts) {
+  if (texts != std::array<std::string, 3>{}) return texts;
+  return {"0", "0", "0"};
+}
+
 void CompleteAxes(const std::string& name, VJointType type,
                   const VSubjectKMTExtras::VSegment& extras, std::array<double, 3>& io_rOrientation,
                   std::vector<std::string>& o_rErrors, std::vector<std::string>& o_rWarnings) {
@@ -112,8 +118,9 @@ void CompleteJointsAndTargets(VReadContext& context, VDynamicExpressionParserSim
     if (version < Versions::V3_2 && extras.m_HasPost) {
       const std::string owner = "segment '" + segment.m_Name + "'";
       std::array<double, 3> rotation{}, translation{};
-      if (EvaluateAll(parser, extras.m_PostRotation, owner, rotation, o_rErrors) &&
-          EvaluateAll(parser, extras.m_PostTranslation, owner, translation, o_rErrors)) {
+      if (EvaluateAll(parser, ZeroIfAbsent(extras.m_PostRotation), owner, rotation, o_rErrors) &&
+          EvaluateAll(parser, ZeroIfAbsent(extras.m_PostTranslation), owner, translation,
+                      o_rErrors)) {
         InverseFromPostValues(version, rotation, translation, segment.m_InversePostRotation,
                               segment.m_InversePostTranslation);
       }

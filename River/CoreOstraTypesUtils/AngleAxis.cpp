@@ -35,7 +35,8 @@ VPose PoseFromAngleAxis(const Vector3& rotation, const Vector3& translation) {
 void InvertAngleAxisPose(const Vector3& rotation, const Vector3& translation, Vector3& o_rRotation,
                          Vector3& o_rTranslation) {
   const VPose inverse = PoseFromAngleAxis(rotation, translation).Inverse();
-  o_rRotation = RotationToAngleAxis(inverse.m_Rotation);
+  // The inverse rotation is the negated vector: exact, so inverting twice gives it back.
+  o_rRotation = {-rotation[0], -rotation[1], -rotation[2]};
   o_rTranslation = {inverse.m_Translation.x(), inverse.m_Translation.y(),
                     inverse.m_Translation.z()};
 }

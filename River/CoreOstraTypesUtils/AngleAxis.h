@@ -23,7 +23,8 @@ Vector3 RotationToAngleAxis(const Eigen::Matrix3d& rotation);
 /// The pose of an angle-axis rotation and a translation.
 VPose PoseFromAngleAxis(const Vector3& rotation, const Vector3& translation);
 
-/// Inverts a pose given as angle-axis rotation and translation, in the same form.
+/// Inverts a pose given as angle-axis rotation and translation, in the same form. The rotation
+/// is the negated vector, so it takes no rounding.
 void InvertAngleAxisPose(const Vector3& rotation, const Vector3& translation, Vector3& o_rRotation,
                          Vector3& o_rTranslation);
 

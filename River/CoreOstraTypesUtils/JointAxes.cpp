@@ -1,5 +1,7 @@
 #include "River/CoreOstraTypesUtils/JointAxes.h"
 
+#include "River/CoreOstraTypesUtils/DecimalRounding.h"
+
 #include <Eigen/Geometry>
 
 namespace CoreOstraTypesUtils {
@@ -13,7 +15,11 @@ Vector3 ToArray(const Eigen::Vector3d& v) {
 } // namespace
 
 Vector3 AxisFromJointOrientation(const Vector3& jointOrientation) {
-  return ToArray(AngleAxisToRotation(jointOrientation).col(2));
+  const Vector3 raw = ToArray(AngleAxisToRotation(jointOrientation).col(2));
+  return PreferReproducing(raw, RoundedToDecimals(raw), [&jointOrientation](const Vector3& axis) {
+    Vector3 back;
+    return JointOrientationFromAxis(axis, back) && back == jointOrientation;
+  });
 }
 
 bool JointOrientationFromAxis(const Vector3& axis, Vector3& o_rJointOrientation) {
@@ -33,7 +39,14 @@ bool JointOrientationFromAxis(const Vector3& axis, Vector3& o_rJointOrientation)
 
 AxisPair AxisPairFromJointOrientation(const Vector3& jointOrientation) {
   const Eigen::Matrix3d r = AngleAxisToRotation(jointOrientation);
-  return {r(0, 2), r(1, 2), r(2, 2), r(0, 1), r(1, 1), r(2, 1)};
+  const AxisPair raw{r(0, 2), r(1, 2), r(2, 2), r(0, 1), r(1, 1), r(2, 1)};
+  AxisPair rounded = raw;
+  RoundToDecimals(rounded.data(), 3);
+  RoundToDecimals(rounded.data() + 3, 3);
+  return PreferReproducing(raw, rounded, [&jointOrientation](const AxisPair& axes) {
+    Vector3 back;
+    return JointOrientationFromAxisPair(axes, back) && back == jointOrientation;
+  });
 }
 
 bool JointOrientationFromAxisPair(const AxisPair& axes, Vector3& o_rJointOrientation) {

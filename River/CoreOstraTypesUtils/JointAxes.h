@@ -14,7 +14,9 @@ using AxisPair = std::array<double, 6>;
 /// Shortest axis accepted; anything shorter has no direction.
 inline constexpr double MinimumAxisLength = 0.001;
 
-/// The hinge or slider axis: R * (0, 0, 1).
+/// The hinge or slider axis: R * (0, 0, 1), rounded as RoundToDecimals does unless only the
+/// unrounded axis gives `jointOrientation` back through JointOrientationFromAxis. So an axis
+/// read from a file comes back as it was read when it was exact or when the conversion was.
 Vector3 AxisFromJointOrientation(const Vector3& jointOrientation);
 
 /// A rotation taking (0, 0, 1) to the normalised `axis`: the shortest one for axes with z >= 0,
@@ -22,7 +24,8 @@ Vector3 AxisFromJointOrientation(const Vector3& jointOrientation);
 /// untouched, when the axis is shorter than MinimumAxisLength.
 bool JointOrientationFromAxis(const Vector3& axis, Vector3& o_rJointOrientation);
 
-/// The two Hardy-Spicer axes: R * (0, 0, 1) then R * (0, 1, 0).
+/// The two Hardy-Spicer axes: R * (0, 0, 1) then R * (0, 1, 0), each rounded as for
+/// AxisFromJointOrientation.
 AxisPair AxisPairFromJointOrientation(const Vector3& jointOrientation);
 
 /// The rotation taking (0, 0, 1) to the first axis and (0, 1, 0) to the second, after the second

@@ -1,7 +1,5 @@
 #include "Utils/UtilsRapidXml/AttributeText.h"
 
-#include <boost/regex.hpp>
-
 #include <cctype>
 #include <charconv>
 #include <cmath>
@@ -15,6 +13,32 @@ namespace {
 bool IsBlank(char c) {
   return c == ' ' || c == '\t';
 }
+
+/// Follows the quoted names of an expression as its parser reads them: a single quote opens a
+/// name, a backslash inside takes the next character as it stands, a single quote closes it.
+class VQuoteScanner {
+public:
+  /// Whether `c` belongs to a quoted name (its quotes included).
+  bool Next(char c) {
+    if (m_Escaped) {
+      m_Escaped = false;
+      return true;
+    }
+    if (m_Quoted) {
+      if (c == '\\') m_Escaped = true;
+      if (c == '\'') m_Quoted = false;
+      return true;
+    }
+    if (c == '\'') m_Quoted = true;
+    return m_Quoted;
+  }
+  /// A name is still open: its closing quote is missing.
+  bool Open() const { return m_Quoted; }
+
+private:
+  bool m_Quoted = false;
+  bool m_Escaped = false;
+};
 
 struct VSpecialDouble {
   std::string_view m_Text;
@@ -70,6 +94,7 @@ bool ParseDouble(std::string_view text, double& o_rValue) {
 }
 
 std::string FormatDouble(double value) {
+  if (value == 0.0) return "0"; // never "-0": a sign on zero is an artefact of arithmetic
   char buffer[40];
   const int n = std::snprintf(buffer, sizeof buffer, "%.17g", value);
   return n > 0 ? std::string(buffer, static_cast<std::size_t>(n)) : std::string();
@@ -120,25 +145,29 @@ bool ParseVersion(std::string_view text, IVersion& o_rVersion) {
 }
 
 bool SplitExpressionList(std::string_view text, std::vector<std::string>& o_rTokens) {
-  static const boost::regex token("(-?'[^']*'[^ ]*|[^ ]+)[ ]*(.+)?");
+  // Tokens end at blanks outside quoted names, wherever the quotes stand in the token. Only the
+  // space separates: a tab inside a token is white space within one expression.
   std::vector<std::string> tokens;
-  std::string rest(TrimBlanks(text));
-  while (!rest.empty()) {
-    boost::smatch match;
-    if (!boost::regex_match(rest, match, token)) return false;
-    tokens.push_back(match[1].str());
-    rest = match[2].matched ? match[2].str() : std::string();
+  std::string token;
+  VQuoteScanner scanner;
+  for (char c : TrimBlanks(text)) {
+    if (!scanner.Next(c) && c == ' ') {
+      if (!token.empty()) tokens.push_back(std::move(token));
+      token.clear();
+      continue;
+    }
+    token += c;
   }
+  if (scanner.Open()) return false;
+  if (!token.empty()) tokens.push_back(std::move(token));
   o_rTokens = std::move(tokens);
   return true;
 }
 
 bool HasUnquotedBlank(std::string_view expression) {
-  bool quoted = false;
-  for (char c : expression) {
-    if (c == '\'') quoted = !quoted;
-    if (!quoted && IsBlank(c)) return true;
-  }
+  VQuoteScanner scanner;
+  for (char c : expression)
+    if (!scanner.Next(c) && IsBlank(c)) return true;
   return false;
 }
 

@@ -21,7 +21,8 @@ std::vector<std::string_view> SplitBlanks(std::string_view text);
 /// (negative quiet NaN).
 bool ParseDouble(std::string_view text, double& o_rValue);
 
-/// "%.17g": round-trips every double; non-finite values print as inf, -inf, nan, -nan.
+/// "%.17g": round-trips every double; non-finite values print as inf, -inf, nan, -nan. Zero
+/// prints as "0" whatever its sign.
 std::string FormatDouble(double value);
 
 /// Trimmed "0" / "1", else case-insensitive "true" / "false".
@@ -33,11 +34,14 @@ bool ParseVersion(std::string_view text, IVersion& o_rVersion);
 /// Unsigned decimal integer that fits 32 bits.
 bool ParseUnsigned(std::string_view text, std::uint32_t& o_rValue);
 
-/// Splits a list of expressions at blanks, keeping single-quoted parts (which may hold blanks)
-/// inside their token. False when the text can't be split.
+/// Splits a list of expressions at spaces outside quoted names. A quoted name may stand anywhere
+/// in a token and hold blanks; inside it a backslash takes the next character (also a quote) as
+/// it stands, as the expression parser reads it. False, with `o_rTokens` untouched, when a quoted
+/// name has no closing quote.
 bool SplitExpressionList(std::string_view text, std::vector<std::string>& o_rTokens);
 
-/// Whether `expression` holds a blank outside single quotes.
+/// Whether `expression` holds a blank or tab outside quoted names (read as SplitExpressionList
+/// reads them).
 bool HasUnquotedBlank(std::string_view expression);
 
 } // namespace UtilsRapidXml

@@ -48,6 +48,11 @@ public:
   virtual void Error(const std::string& message) = 0;
   virtual void Warning(const std::string& message) = 0;
   virtual std::uint64_t ErrorCount() const = 0;
+
+  /// The declaration refuses this element and stops: what it didn't declare is not reported as
+  /// unrecognised, since the one error that refused it is what matters. Nothing for nodes that
+  /// don't read.
+  virtual void Abandon() {}
 };
 
 } // namespace UtilsRapidXml

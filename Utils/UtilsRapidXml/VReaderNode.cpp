@@ -26,6 +26,7 @@ VReaderNode::~VReaderNode() {
 }
 
 void VReaderNode::ReportUnvisited() {
+  if (m_Abandoned) return;
   for (auto* attribute = m_pNode->first_attribute(); attribute;
        attribute = attribute->next_attribute()) {
     const std::string key = m_Path + "/" + std::string(NodeName(attribute));

@@ -30,7 +30,8 @@ public:
   /// Node for one element; its path is `parentPath` + "/" + the element name.
   VReaderNode(rapidxml::xml_node<>* node, std::shared_ptr<VGlobalInfo> info,
               const std::string& parentPath);
-  /// Adds a warning for every attribute and child element that no declaration visited.
+  /// Adds a warning for every attribute and child element that no declaration visited, unless
+  /// the declaration abandoned the element.
   ~VReaderNode() override;
 
   VReaderNode(const VReaderNode&) = delete;
@@ -54,6 +55,7 @@ public:
   void Error(const std::string& message) override { m_pInfo->m_Errors.push_back(message); }
   void Warning(const std::string& message) override { m_pInfo->m_Warnings.push_back(message); }
   std::uint64_t ErrorCount() const override { return m_pInfo->m_Errors.size(); }
+  void Abandon() override { m_Abandoned = true; }
 
 private:
   struct VDeclaration {
@@ -80,6 +82,7 @@ private:
   std::set<std::string> m_VisitedElements;
   std::vector<VDeclaration> m_Declarations;
   std::size_t m_LastPosition = 0; ///< position of the last accepted child, for strict order
+  bool m_Abandoned = false;
 };
 
 } // namespace UtilsRapidXml

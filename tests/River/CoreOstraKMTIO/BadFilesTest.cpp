@@ -37,6 +37,17 @@ void ExpectError(const std::string& text, const std::string& error) {
 
 } // namespace
 
+TEST(KmtBadFiles, ARefusedFileGivesItsOneErrorAndNothingElse) {
+  const std::string rest = "<TargetSet/><Skin/><Unknown/>";
+  for (const auto& text : {Document("3.6", Body, "", rest), Document("0.9", Body, "", rest),
+                           Document("3.5", Body, "", rest, " DEVELOPMENT=\"1\" xmlns:xsi=\"x\"")}) {
+    const auto back = ReadString(text);
+    EXPECT_EQ(back.m_Result, ResultFailed);
+    EXPECT_EQ(back.m_Errors.size(), 1u) << text;
+    EXPECT_THAT(back.m_Warnings, ::testing::IsEmpty()) << text;
+  }
+}
+
 TEST(KmtBadFiles, VersionsOutsideTheLanguageAndDevelopmentFilesAreRefused) {
   ExpectError(Document("3.6", Body, ""),
               "Cannot load KMT file with version 3.6, maximum supported version is 3.5");

@@ -117,3 +117,36 @@ TEST(KmtOldFiles, Version3_1TakesPostValuesAsTheInverse) {
   EXPECT_EQ(body.m_Covariance[45], 2.0);
   EXPECT_EQ(body.m_ViewNormals[0], (std::array<double, 3>{0, 1, 0}));
 }
+
+TEST(KmtOldFiles, OnePostAttributeCountsTheOtherAsZero) {
+  const auto file = [](const std::string& version, const std::string& joint,
+                       const std::string& jointTemplate) {
+    return "<KinematicModel VERSION=\"" + version +
+           "\"><Skeleton><Segment NAME=\"A\"><JointFree NAME=\"J\" " + joint + "><JointTemplate " +
+           jointTemplate +
+           "/></JointFree></Segment></Skeleton><MarkerSet><Markers/></MarkerSet>"
+           "</KinematicModel>";
+  };
+  struct VCase {
+    std::string m_Version, m_Joint, m_Template;
+    std::array<double, 3> m_Rotation, m_Translation;
+  };
+  const VCase cases[] = {
+      // Before 3.0 the file holds Q: a translation alone inverts to its negation.
+      {"2.0", "POST-POSITION=\"10 0 -20\"", "", {0, 0, 0}, {-10, 0, 20}},
+      {"2.6", "", "POST-ORIENTATION=\"0 0 0.5\"", {0, 0, -0.5}, {0, 0, 0}},
+      // 3.0 and 3.1 hold the inverse under the same names.
+      {"3.1", "POST-ORIENTATION=\"0 0 0.5\"", "", {0, 0, 0.5}, {0, 0, 0}},
+      {"3.0", "", "POST-POSITION=\"1 2 3\"", {0, 0, 0}, {1, 2, 3}},
+      // One half on the joint, the other on its template.
+      {"3.1", "POST-POSITION=\"1 2 3\"", "POST-ORIENTATION=\"0 0.5 0\"", {0, 0.5, 0}, {1, 2, 3}},
+  };
+  for (const auto& c : cases) {
+    const auto back = ReadString(file(c.m_Version, c.m_Joint, c.m_Template));
+    ASSERT_EQ(back.m_Result, ResultOk)
+        << c.m_Version << c.m_Joint << c.m_Template << ": " << back.m_Errors[0];
+    const auto& segment = back.m_Records.m_Subject.m_Segments.at(0);
+    EXPECT_EQ(segment.m_InversePostRotation, c.m_Rotation) << c.m_Version << c.m_Joint;
+    EXPECT_EQ(segment.m_InversePostTranslation, c.m_Translation) << c.m_Version << c.m_Joint;
+  }
+}

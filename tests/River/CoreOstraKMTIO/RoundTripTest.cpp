@@ -201,6 +201,20 @@ TEST_P(KmtRoundTrip, ReadsBackWhatTheVersionHolds) {
       << output;
 }
 
+TEST_P(KmtRoundTrip, WritingWhatWasReadGivesTheSameText) {
+  const auto rich = MakeRichSubject();
+  std::string first, second;
+  ASSERT_EQ(VWriter().WriteText(first, rich.m_Subject, rich.m_AppData, rich.m_Subspace, GetParam()),
+            ResultOk);
+  const auto back = ReadString(first);
+  ASSERT_EQ(back.m_Result, ResultOk) << (back.m_Errors.empty() ? "" : back.m_Errors[0]);
+  const auto& b = back.m_Records;
+  ASSERT_EQ(VWriter().WriteText(second, b.m_Subject, b.m_AppData, b.m_Subspace, GetParam()),
+            ResultOk);
+  EXPECT_EQ(second, first);
+  EXPECT_EQ(first.find("e-16"), std::string::npos) << "no rounding noise in exact axes";
+}
+
 INSTANTIATE_TEST_SUITE_P(Versions, KmtRoundTrip,
                          ::testing::Values(0, 1, 3, 8, 9, 11, 12, 13, 14, 15, 16),
                          [](const auto& info) {

@@ -128,6 +128,7 @@ TEST(MathFactorySimpleLinear, TracksParametersAndConstants) {
 TEST(ExpressionNumber, SeventeenDigitsAndPortableNonFiniteSpellings) {
   EXPECT_EQ(FormatExpressionNumber(0.1), "0.10000000000000001");
   EXPECT_EQ(FormatExpressionNumber(-2.0), "-2");
+  EXPECT_EQ(FormatExpressionNumber(-0.0), "0");
   EXPECT_EQ(FormatExpressionNumber(1e-320), "9.9998886718268301e-321");
   EXPECT_EQ(FormatExpressionNumber(INFINITY), "inf");
   EXPECT_EQ(FormatExpressionNumber(-INFINITY), "-inf");

@@ -53,14 +53,34 @@ TEST(AttributeText, FlagsVersionsAndIntegers) {
   EXPECT_FALSE(ParseUnsigned("-1", u));
 }
 
-TEST(AttributeText, ExpressionListsKeepQuotedBlanks) {
+TEST(AttributeText, ExpressionListsKeepQuotedNamesWhereverTheyStand) {
   std::vector<std::string> t;
   ASSERT_TRUE(SplitExpressionList("  a   'b c'/2 -'d e'  f*'g h' ", t));
-  EXPECT_THAT(t, ElementsAre("a", "'b c'/2", "-'d e'", "f*'g", "h'"));
+  EXPECT_THAT(t, ElementsAre("a", "'b c'/2", "-'d e'", "f*'g h'"));
+  ASSERT_TRUE(SplitExpressionList("(1+'a b')*2 x^'c  d' sin('e f')", t));
+  EXPECT_THAT(t, ElementsAre("(1+'a b')*2", "x^'c  d'", "sin('e f')"));
+  // A backslash takes the next character, a quote or a blank, into the name.
+  ASSERT_TRUE(SplitExpressionList(R"('it\'s x'*2 'back\\' 3)", t));
+  EXPECT_THAT(t, ElementsAre(R"('it\'s x'*2)", R"('back\\')", "3"));
+  // A tab is white space inside one expression, as it always was.
+  ASSERT_TRUE(SplitExpressionList("a\t+\tb c", t));
+  EXPECT_THAT(t, ElementsAre("a\t+\tb", "c"));
   ASSERT_TRUE(SplitExpressionList("", t));
   EXPECT_TRUE(t.empty());
-  ASSERT_TRUE(SplitExpressionList("'unterminated x", t));
-  EXPECT_THAT(t, ElementsAre("'unterminated", "x"));
+  t = {"kept"};
+  EXPECT_FALSE(SplitExpressionList("'unterminated x", t));
+  EXPECT_FALSE(SplitExpressionList(R"('a\' b)", t));
+  EXPECT_THAT(t, ElementsAre("kept"));
+
   EXPECT_TRUE(HasUnquotedBlank("a + b"));
+  EXPECT_TRUE(HasUnquotedBlank("a\t+b"));
   EXPECT_FALSE(HasUnquotedBlank("'a b'*c"));
+  EXPECT_FALSE(HasUnquotedBlank(R"(2*'it\'s x')"));
+  EXPECT_TRUE(HasUnquotedBlank(R"('a\\' b)"));
+}
+
+TEST(AttributeText, ZeroPrintsWithoutASign) {
+  EXPECT_EQ(FormatDouble(-0.0), "0");
+  EXPECT_EQ(FormatDouble(0.0), "0");
+  EXPECT_EQ(FormatDouble(-0.1), "-0.10000000000000001");
 }
