@@ -31,6 +31,29 @@ void nameList(std::ostream& o_rOut, const char* i_pTitle, const std::vector<std:
   }
   o_rOut << '\n';
 }
+std::string number(double i_value) {
+  char text[32];
+  std::snprintf(text, sizeof text, "%g", i_value);
+  return text;
+}
+
+// "; -1.5..20 N, 0..3 V": the range of the true values of each measured channel.
+std::string measuredRanges(const AudioSource& i_rAudio) {
+  if (!i_rAudio.hasMeasurements()) return "";
+  std::string text;
+  for (int c = 0; c < i_rAudio.getNumChannels(); ++c) {
+    const AnalogChannel& channel = i_rAudio.getMeasurement(c);
+    double low = 0.0, high = 0.0;
+    for (size_t i = 0; i < channel.readings.size(); ++i) {
+      const double value = channel.valueAt(i);
+      if (i == 0 || value < low) low = value;
+      if (i == 0 || value > high) high = value;
+    }
+    text += (c == 0 ? "; " : ", ") + number(low) + ".." + number(high);
+    if (!channel.units.empty()) text += " " + channel.units;
+  }
+  return text;
+}
 } // namespace
 
 void describeScene(std::ostream& o_rOut) {
@@ -78,10 +101,10 @@ void describeScene(std::ostream& o_rOut) {
   for (Module* p : g_db->getModules()) {
     if (!p->isKindOf(&AudioSource::s_classAudioSource)) continue;
     const AudioSource* pAudio = static_cast<const AudioSource*>(p);
-    audio.push_back("\"" + p->getName().GetString() + "\" (" +
-                    std::to_string(pAudio->getNumChannels()) + " ch, " +
-                    std::to_string(pAudio->getSampleRate()) + " Hz, " +
-                    std::to_string(pAudio->getNumSamples()) + " samples)");
+    audio.push_back(
+        "\"" + p->getName().GetString() + "\" (" + std::to_string(pAudio->getNumChannels()) +
+        " ch, " + number(pAudio->getSampleRate()) + " Hz, " +
+        std::to_string(pAudio->getNumSamples()) + " samples" + measuredRanges(*pAudio) + ")");
   }
   nameList(o_rOut, "audio sources", audio);
 

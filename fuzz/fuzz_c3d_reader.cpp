@@ -3,6 +3,7 @@
 // inside the buffer and allocations bounded by its size.
 #include "AnvilCore/io/C3DReader.h"
 #include "AnvilCore/io/TrajectoryScene.h"
+#include "exporters/trajectory/c3d/PrintableText.h"
 #include "plugin/host/Marker.h"
 #include <cstddef>
 #include <cstdint>
@@ -13,9 +14,16 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* i_pData, size_t i_size) {
   AnvilCore::C3DContent content;
   std::string error;
   if (!AnvilCore::parseC3D(i_pData, i_size, content, error)) {
-    if (error.empty()) std::abort(); // a failure always says why
+    // A failure always says why, in printable text.
+    if (error.empty() || C3D::printableText(error) != error) std::abort();
     return 0;
   }
+  for (const std::string& label : content.labels)
+    if (C3D::printableText(label) != label) std::abort();
+  if (content.analogOffsets.size() != size_t(content.analogChannels) ||
+      content.analogScales.size() != size_t(content.analogChannels) ||
+      content.analogUnits.size() != size_t(content.analogChannels))
+    std::abort();
   if (content.labels.size() != size_t(content.pointCount) ||
       content.points.size() != size_t(content.pointCount) * size_t(content.frameCount) * 4 ||
       content.analog.size() != size_t(content.frameCount) * size_t(content.analogChannels) *

@@ -1,4 +1,5 @@
 #include "C3DReader.h"
+#include "exporters/trajectory/c3d/PrintableText.h"
 #include <algorithm>
 #include <cmath>
 #include <cstdio>
@@ -10,6 +11,9 @@ namespace {
 // The largest parameter record payload accepted: a record never spans more than 64k of data in
 // files written by anyone, and the cap keeps absurd dimensions from allocating.
 constexpr size_t kMaxParameterBytes = 16u << 20;
+// Largest coordinate, in millimetres, of a plausible recording: from a hand-sized volume to a
+// large stage.
+constexpr double kPlausibleMm[2] = {10.0, 100000.0};
 
 struct C3DError {
   std::string message;
@@ -264,14 +268,23 @@ private:
     m_rOut.frameCount = int(last - first + 1);
   }
 
+  static bool usableScale(float i_scale) { return std::isfinite(i_scale) && i_scale != 0.0f; }
+
   void readScaleAndRate() {
-    m_rOut.scale = real(C3D::HeaderOffset::EScale);
+    // The header and POINT:SCALE may disagree; `resolveScale` chooses once the frames' place is
+    // known. Until then the parameter's (or the header's) stands.
+    m_headerScale = real(C3D::HeaderOffset::EScale);
+    m_rOut.scale = m_headerScale;
     size_t scaleAt = C3D::HeaderOffset::EScale;
     if (const C3DParameter* p = m_rOut.find("POINT", "SCALE")) {
-      m_rOut.scale = p->floatValue(0);
-      scaleAt = p->offset;
+      m_parameterScale = p->floatValue(0);
+      m_hasParameterScale = true;
+      if (usableScale(m_parameterScale) || !usableScale(m_headerScale)) {
+        m_rOut.scale = m_parameterScale;
+        scaleAt = p->offset;
+      }
     }
-    if (!std::isfinite(m_rOut.scale) || m_rOut.scale == 0.0f)
+    if (!usableScale(m_rOut.scale))
       fail("the point scale is " + std::to_string(m_rOut.scale), scaleAt);
     double rate = real(C3D::HeaderOffset::EFrameRate);
     size_t rateAt = C3D::HeaderOffset::EFrameRate;
@@ -288,6 +301,22 @@ private:
     }
   }
 
+  // Names from the file made printable; one warning per kind of name says how many were not.
+  void makePrintable(std::vector<std::string>& io_rNames, const char* i_pWhat) {
+    size_t damaged = 0, first = 0;
+    for (size_t i = 0; i < io_rNames.size(); ++i) {
+      bool changed = false;
+      io_rNames[i] = C3D::printableText(io_rNames[i], &changed);
+      if (changed && damaged++ == 0) first = i;
+    }
+    if (damaged > 0)
+      m_rOut.warnings.push_back(std::to_string(damaged) + " " + i_pWhat +
+                                " held characters that cannot be printed, replaced by '?' (the "
+                                "first, number " +
+                                std::to_string(first + 1) + ", reads \"" + io_rNames[first] +
+                                "\")");
+  }
+
   void readLabels() {
     std::vector<std::string> labels;
     for (int chunk = 1; labels.size() < size_t(m_rOut.pointCount); ++chunk) {
@@ -298,6 +327,7 @@ private:
         labels.push_back(trim(std::move(label)));
     }
     labels.resize(size_t(m_rOut.pointCount));
+    makePrintable(labels, "point labels");
     for (size_t i = 0; i < labels.size(); ++i)
       if (labels[i].empty()) labels[i] = "Point" + std::to_string(i + 1);
     m_rOut.labels = std::move(labels);
@@ -306,8 +336,10 @@ private:
     const C3DParameter* pPrefixes = m_rOut.find("SUBJECTS", "LABEL_PREFIXES");
     if (!pUses || pUses->intValue(0) == 0 || !pPrefixes) return;
     const C3DParameter* pNames = m_rOut.find("SUBJECTS", "NAMES");
-    const std::vector<std::string> names = pNames ? pNames->strings() : std::vector<std::string>();
-    const std::vector<std::string> prefixes = pPrefixes->strings();
+    std::vector<std::string> names = pNames ? pNames->strings() : std::vector<std::string>();
+    std::vector<std::string> prefixes = pPrefixes->strings();
+    makePrintable(names, "subject names");
+    makePrintable(prefixes, "subject label prefixes");
     for (size_t i = 0; i < prefixes.size(); ++i) {
       SubjectPrefix entry{trim(prefixes[i]), i < names.size() ? trim(names[i]) : std::string()};
       if (entry.prefix.empty()) continue;
@@ -347,25 +379,139 @@ private:
         labels.push_back(trim(std::move(label)));
     }
     labels.resize(size_t(channels));
+    makePrintable(labels, "analog labels");
     for (size_t i = 0; i < labels.size(); ++i)
       if (labels[i].empty()) labels[i] = "Analog" + std::to_string(i + 1);
     m_rOut.analogLabels = std::move(labels);
+    readAnalogCalibration();
+  }
+
+  void readAnalogCalibration() {
+    const size_t channels = size_t(m_rOut.analogChannels);
+    m_rOut.analogOffsets.assign(channels, 0.0);
+    m_rOut.analogScales.assign(channels, 1.0);
+    m_rOut.analogUnits.assign(channels, std::string());
+    if (const C3DParameter* p = m_rOut.find("ANALOG", "OFFSET"))
+      for (size_t c = 0; c < channels && c < p->count(); ++c)
+        m_rOut.analogOffsets[c] = double(p->intValue(c));
+    double general = 1.0;
+    if (const C3DParameter* p = m_rOut.find("ANALOG", "GEN_SCALE")) {
+      const double value = p->floatValue(0);
+      if (std::isfinite(value) && value != 0.0) general = value;
+    }
+    const C3DParameter* pScale = m_rOut.find("ANALOG", "SCALE");
+    for (size_t c = 0; c < channels; ++c) {
+      double scale = pScale && c < pScale->count() ? pScale->floatValue(c) : 1.0;
+      if (!std::isfinite(scale)) scale = 1.0;
+      m_rOut.analogScales[c] = scale * general;
+    }
+    if (const C3DParameter* p = m_rOut.find("ANALOG", "UNITS")) {
+      std::vector<std::string> units = p->strings();
+      units.resize(channels);
+      for (std::string& unit : units)
+        unit = trim(std::move(unit));
+      makePrintable(units, "analog units");
+      m_rOut.analogUnits = std::move(units);
+    }
   }
 
   // Checks that every frame lies inside the file before anything is allocated for it.
-  size_t frameBytes() const {
-    const size_t valueSize = m_rOut.scale < 0.0f ? 4 : 2;
+  size_t frameBytes(bool i_isFloat) const {
+    const size_t valueSize = i_isFloat ? 4 : 2;
     return valueSize * (size_t(m_rOut.pointCount) * 4 +
                         size_t(m_rOut.analogSamplesPerFrame) * size_t(m_rOut.analogChannels));
+  }
+  size_t frameBytes() const { return frameBytes(m_rOut.scale < 0.0f); }
+
+  // Whether frames of one form fill the data exactly (up to the padding of the last block), or
+  // at least fit in it.
+  bool formFitsData(bool i_isFloat) const {
+    const size_t bytes = frameBytes(i_isFloat);
+    return bytes == 0 || size_t(m_rOut.frameCount) <= (m_size - m_dataStart) / bytes;
+  }
+  bool formFillsData(bool i_isFloat) const {
+    if (!formFitsData(i_isFloat)) return false;
+    const size_t need = frameBytes(i_isFloat) * size_t(m_rOut.frameCount);
+    return m_size - m_dataStart - need < size_t(C3D::kBlockSize);
+  }
+
+  // The largest coordinate, in millimetres, that integer frames give with a scale of 1.
+  double largestIntegerCoordinate() const {
+    const size_t bytes = frameBytes(false);
+    if (bytes == 0) return 0.0;
+    const size_t frames = std::min(size_t(m_rOut.frameCount), (m_size - m_dataStart) / bytes);
+    int largest = 0;
+    for (size_t f = 0; f < frames; ++f)
+      for (size_t i = 0; i < size_t(m_rOut.pointCount); ++i) {
+        const size_t at = m_dataStart + f * bytes + i * 8;
+        if (int16_t(word(at + 6)) < 0) continue; // a gap
+        for (size_t k = 0; k < 3; ++k)
+          largest = std::max(largest, std::abs(int(int16_t(word(at + 2 * k)))));
+      }
+    const double toMillimetres = millimetresPer(m_rOut.units);
+    return double(largest) * (toMillimetres > 0.0 ? toMillimetres : 1.0);
+  }
+
+  // The header's scale and POINT:SCALE disagree: the sign says which form the frames take, the
+  // magnitude what an integer step is worth. Chosen, with a warning:
+  // - the form whose frames fill the data (then the one whose frames fit), else the parameter's;
+  // - for integer frames of two magnitudes, the one whose largest coordinate is plausible for a
+  //   capture volume (kPlausibleMm); when both or neither are, the header's, which is written
+  //   with the frames themselves while parameters are often edited by other programs later.
+  void resolveScale() {
+    const float header = m_headerScale, parameter = m_parameterScale;
+    if (!m_hasParameterScale || !usableScale(header) || !usableScale(parameter) ||
+        header == parameter)
+      return;
+    std::string reason;
+    bool isFloat = parameter < 0.0f;
+    if ((header < 0.0f) != (parameter < 0.0f)) {
+      const bool floatFills = formFillsData(true), integerFills = formFillsData(false);
+      if (floatFills != integerFills) {
+        isFloat = floatFills;
+        reason = "its sign gives frames that fill the data";
+      } else if (formFitsData(true) != formFitsData(false)) {
+        isFloat = formFitsData(true);
+        reason = "its sign gives frames that fit in the file";
+      } else {
+        reason = "the data do not tell the forms apart";
+      }
+    }
+    float chosen = isFloat == (parameter < 0.0f) ? parameter : header;
+    if (!isFloat && std::fabs(header) != std::fabs(parameter) && header > 0.0f &&
+        parameter > 0.0f) {
+      const double largest = largestIntegerCoordinate();
+      const auto plausible = [&](float i_scale) {
+        const double mm = largest * double(i_scale);
+        return mm >= kPlausibleMm[0] && mm <= kPlausibleMm[1];
+      };
+      if (plausible(parameter) && !plausible(header)) {
+        chosen = parameter;
+        reason = "only it gives coordinates of a plausible size";
+      } else if (plausible(header) && !plausible(parameter)) {
+        chosen = header;
+        reason = "only it gives coordinates of a plausible size";
+      } else {
+        chosen = header;
+        reason = "the header's scale is written with the frames";
+      }
+    }
+    char text[200];
+    std::snprintf(text, sizeof text,
+                  "the header's point scale %g and POINT:SCALE %g disagree; %g is used (%s)",
+                  double(header), double(parameter), double(chosen), reason.c_str());
+    m_rOut.warnings.push_back(text);
+    m_rOut.scale = chosen;
   }
 
   void readPoints() {
     if (m_dataBlock == 0) fail("the header's data start block is 0", C3D::HeaderOffset::EDataStart);
     m_dataStart = size_t(m_dataBlock - 1) * C3D::kBlockSize;
-    const size_t bytes = frameBytes();
     if (m_dataStart > m_size)
       fail("the frames start at byte " + std::to_string(m_dataStart) + ", past the end of the file",
            C3D::HeaderOffset::EDataStart);
+    resolveScale();
+    const size_t bytes = frameBytes();
     const size_t available = m_size - m_dataStart;
     if (bytes > 0 && size_t(m_rOut.frameCount) > available / bytes) {
       // Some writers declare more frames than they wrote; a file that stops at the end of a
@@ -411,10 +557,7 @@ private:
   void readAnalog() {
     const size_t channels = size_t(m_rOut.analogChannels);
     if (channels == 0) return;
-    std::vector<double> offsets(channels, 0.0);
-    if (const C3DParameter* p = m_rOut.find("ANALOG", "OFFSET"))
-      for (size_t c = 0; c < channels && c < p->count(); ++c)
-        offsets[c] = double(p->intValue(c));
+    const std::vector<double>& offsets = m_rOut.analogOffsets;
     bool isUnsigned = false;
     if (const C3DParameter* p = m_rOut.find("ANALOG", "FORMAT")) {
       const auto format = p->strings();
@@ -447,6 +590,9 @@ private:
   const uint8_t* m_pData;
   size_t m_size;
   C3DContent& m_rOut;
+  float m_headerScale = 0.0f;
+  float m_parameterScale = 0.0f;
+  bool m_hasParameterScale = false;
   size_t m_parameterStart = 0;
   size_t m_dataStart = 0;
   int m_dataBlock = 0;
@@ -460,7 +606,8 @@ bool parseC3D(const uint8_t* i_pData, size_t i_size, C3DContent& o_rContent,
     C3DParser(i_pData, i_size, o_rContent).parse();
     return true;
   } catch (const C3DError& e) {
-    o_rError = e.message;
+    // Messages quote names from the file, which may hold NULs or control characters.
+    o_rError = C3D::printableText(e.message);
     return false;
   }
 }

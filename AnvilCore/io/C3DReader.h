@@ -52,8 +52,14 @@ struct C3DContent {
   int analogSamplesPerFrame = 0;
   double analogRate = 0.0;
   std::vector<std::string> analogLabels; ///< one per channel
+  /// Per channel: ANALOG:OFFSET, ANALOG:SCALE times ANALOG:GEN_SCALE (1 when absent), and
+  /// ANALOG:UNITS (empty when absent). The value of a channel is (reading - offset) * scale.
+  std::vector<double> analogOffsets;
+  std::vector<double> analogScales;
+  std::vector<std::string> analogUnits;
   /// frameCount * samplesPerFrame * channels values, frame by frame, sample by sample: the raw
-  /// reading minus the channel's OFFSET (ADC counts; SCALE is not applied).
+  /// reading minus the channel's OFFSET, at full precision (SCALE is not applied; a non-finite
+  /// float reading is 0).
   std::vector<double> analog;
 
   /// What was read leniently (a frame count larger than the data, ...), for the log.

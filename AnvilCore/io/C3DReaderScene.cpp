@@ -11,16 +11,13 @@ namespace AnvilCore {
 
 namespace {
 
-int16_t wrapToInt16(double i_value) {
-  const long long v = std::llround(i_value);
-  return int16_t(uint16_t(uint64_t(v) & 0xFFFF));
-}
-
-// Consecutive channels with one label form one source; each source starts at the first frame.
+// Consecutive channels with one label form one source; each source starts at the first frame,
+// runs at the analog rate as the file gives it, and keeps the readings at full precision with
+// their offset, scale and units.
 void addAnalogSources(const C3DContent& i_rContent, TrajectorySceneBuilder& io_rBuilder) {
   const int channels = i_rContent.analogChannels;
-  const int rate = int(std::lround(i_rContent.analogRate));
-  if (channels == 0 || rate <= 0) return;
+  const double rate = i_rContent.analogRate;
+  if (channels == 0 || !(rate > 0.0)) return;
   const size_t samples = size_t(i_rContent.frameCount) * size_t(i_rContent.analogSamplesPerFrame);
   if (samples == 0) return;
   for (int first = 0; first < channels;) {
@@ -28,13 +25,18 @@ void addAnalogSources(const C3DContent& i_rContent, TrajectorySceneBuilder& io_r
     while (last + 1 < channels &&
            i_rContent.analogLabels[size_t(last + 1)] == i_rContent.analogLabels[size_t(first)])
       ++last;
-    std::vector<std::vector<int16_t>> data(size_t(last - first + 1), std::vector<int16_t>(samples));
-    for (size_t s = 0; s < samples; ++s)
-      for (int c = first; c <= last; ++c)
-        data[size_t(c - first)][s] =
-            wrapToInt16(i_rContent.analog[s * size_t(channels) + size_t(c)]);
+    std::vector<AnalogChannel> data(size_t(last - first + 1));
+    for (int c = first; c <= last; ++c) {
+      AnalogChannel& channel = data[size_t(c - first)];
+      channel.offset = i_rContent.analogOffsets[size_t(c)];
+      channel.scale = i_rContent.analogScales[size_t(c)];
+      channel.units = i_rContent.analogUnits[size_t(c)];
+      channel.readings.resize(samples);
+      for (size_t s = 0; s < samples; ++s)
+        channel.readings[s] = i_rContent.analog[s * size_t(channels) + size_t(c)] + channel.offset;
+    }
     auto pSource = std::make_unique<AudioSource>(HString(i_rContent.analogLabels[size_t(first)]));
-    if (pSource->setSamples(rate, std::move(data))) {
+    if (pSource->setMeasurements(rate, std::move(data))) {
       pSource->setStartTime(io_rBuilder.frameTime(i_rContent.firstFrame));
       io_rBuilder.addTopLevel(pSource.release());
     }

@@ -1,4 +1,5 @@
 #include "TrajectoryScene.h"
+#include "exporters/trajectory/c3d/PrintableText.h"
 #include "plugin/host/Character.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/Marker.h"
@@ -58,13 +59,44 @@ bool framesFitClock(double i_rate, int64_t i_firstFrame, int64_t i_lastFrame) {
   return extent * ticksPerFrame < 1e18;
 }
 
+UnitReading readUnit(const std::string& i_text) {
+  struct Unit {
+    double millimetres;
+    const char* name;
+    const char* symbol;
+    std::vector<const char*> words;
+  };
+  static const Unit kUnits[] = {
+      {1.0, "millimetres", "mm", {"millimetres", "millimeters"}},
+      {10.0, "centimetres", "cm", {"centimetres", "centimeters"}},
+      {1000.0, "metres", "m", {"metres", "meters"}},
+      {25.4, "inches", "in", {"inches"}},
+  };
+  std::string text = lower(i_text);
+  while (!text.empty() && (text.back() == ' ' || text.back() == '.'))
+    text.pop_back();
+  text.erase(0, std::min(text.size(), text.find_first_not_of(' ')));
+  UnitReading reading;
+  if (text.empty()) return reading;
+  for (const Unit& unit : kUnits) {
+    bool exact = text == unit.symbol;
+    for (const char* pWord : unit.words) {
+      const std::string word = pWord;
+      // The word itself, or its singular ("metre", "inch").
+      const std::string singular = word.substr(0, word.size() - (word == "inches" ? 2 : 1));
+      exact = exact || text == word || text == singular;
+    }
+    if (exact) return {unit.millimetres, false, unit.name};
+  }
+  for (const Unit& unit : kUnits)
+    for (const char* pWord : unit.words)
+      if (text.size() >= 2 && std::string(pWord).compare(0, text.size(), text) == 0)
+        return {unit.millimetres, true, unit.name};
+  return reading;
+}
+
 double millimetresPer(const std::string& i_unit) {
-  const std::string unit = lower(i_unit);
-  if (unit == "mm") return 1.0;
-  if (unit == "cm") return 10.0;
-  if (unit == "m") return 1000.0;
-  if (unit == "in") return 25.4;
-  return 0.0;
+  return readUnit(i_unit).millimetres;
 }
 
 void logReaderWarnings(const std::string& i_path, const std::vector<std::string>& i_warnings) {
@@ -73,9 +105,15 @@ void logReaderWarnings(const std::string& i_path, const std::vector<std::string>
 }
 
 double fileUnitsToMillimetres(const std::string& i_path, const std::string& i_unit) {
-  const double factor = millimetresPer(i_unit);
-  if (factor > 0.0) return factor;
-  g_db->logWarning("%s: unknown units \"%s\"; read as millimetres", i_path.c_str(), i_unit.c_str());
+  const std::string shown = C3D::printableText(i_unit);
+  const UnitReading reading = readUnit(i_unit);
+  if (reading.millimetres > 0.0) {
+    if (reading.guessed)
+      g_db->logWarning("%s: units \"%s\" taken as %s (a shortened name)", i_path.c_str(),
+                       shown.c_str(), reading.name);
+    return reading.millimetres;
+  }
+  g_db->logWarning("%s: unknown units \"%s\"; read as millimetres", i_path.c_str(), shown.c_str());
   return 1.0;
 }
 

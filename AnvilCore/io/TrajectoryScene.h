@@ -26,12 +26,25 @@ void splitTrajectoryLabel(const std::string& i_label, const std::vector<SubjectP
 /// the host's clock (signed 64-bit ticks, with a wide margin).
 bool framesFitClock(double i_rate, int64_t i_firstFrame, int64_t i_lastFrame);
 
-/// Multiplier from a unit name ("mm", "cm", "m", "in", any case) to millimetres; 0 when unknown.
+/// A unit text read by its meaning.
+struct UnitReading {
+  double millimetres = 0.0; ///< millimetres per unit; 0 when the text names no known unit
+  bool guessed = false;     ///< true when the text is a shortened name ("mete", "cent")
+  const char* name = "";    ///< "millimetres", "centimetres", "metres" or "inches"
+};
+
+/// Reads a unit text in any case, with blanks and a trailing "." ignored: the symbols "mm",
+/// "cm", "m", "in", the names millimetre, centimetre, metre (either spelling, singular or
+/// plural), inch and inches; and, as a guess, any shortening of those names to two or more
+/// letters ("mete", "millim", "cent", "inc"), each of which belongs to one unit only.
+UnitReading readUnit(const std::string& i_text);
+
+/// Multiplier from a unit text to millimetres, by `readUnit`; 0 when unknown.
 double millimetresPer(const std::string& i_unit);
 
 /// What the two trajectory readers share around their parsers: logging the parser's warnings,
-/// and the multiplier to millimetres of the file's unit (an unknown or empty unit is logged and
-/// read as millimetres).
+/// and the multiplier to millimetres of the file's unit (a shortened unit name is read by its
+/// meaning with a warning; an unknown or empty unit is logged and read as millimetres).
 void logReaderWarnings(const std::string& i_path, const std::vector<std::string>& i_warnings);
 double fileUnitsToMillimetres(const std::string& i_path, const std::string& i_unit);
 

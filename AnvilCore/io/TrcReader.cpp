@@ -1,6 +1,6 @@
 #include "TrcReader.h"
 #include "TrajectoryScene.h"
-#include <cerrno>
+#include "exporters/trajectory/c3d/PrintableText.h"
 #include <cmath>
 #include <cstdlib>
 #include <limits>
@@ -46,13 +46,15 @@ bool lowerEquals(std::string_view i_a, const char* i_pB) {
   return i == i_a.size() && !i_pB[i];
 }
 
+// A number as strtod reads it. Out of range is not an error: a value below the smallest
+// denormal reads as 0 (or the denormal), one above the largest double as an infinity, which the
+// callers refuse (counts, rates) or take as a gap (coordinates).
 bool toDouble(std::string_view i_text, double& o_rValue) {
-  if (i_text.empty() || i_text.size() > 64) return false;
+  if (i_text.empty() || i_text.size() > 400) return false;
   const std::string text(i_text);
   char* pEnd = nullptr;
-  errno = 0;
   o_rValue = std::strtod(text.c_str(), &pEnd);
-  return *pEnd == '\0' && errno != ERANGE;
+  return pEnd != text.c_str() && *pEnd == '\0';
 }
 
 bool toInt(std::string_view i_text, int& o_rValue) {
@@ -174,7 +176,12 @@ private:
       if (column >= i_fields.size() || i_fields[column].empty())
         fail("marker " + std::to_string(k + 1) + " of " + std::to_string(m_markerCount) +
              " (NumMarkers) has no name");
-      m_rOut.labels.emplace_back(i_fields[column]);
+      bool changed = false;
+      m_rOut.labels.push_back(C3D::printableText(i_fields[column], &changed));
+      if (changed)
+        m_rOut.warnings.push_back("marker " + std::to_string(k + 1) +
+                                  " has a name with characters that cannot be printed; read as \"" +
+                                  m_rOut.labels.back() + "\"");
     }
   }
 
@@ -205,8 +212,10 @@ private:
           present = false;
           continue;
         }
-        if (!toDouble(field, xyz[c]) || !std::isfinite(xyz[c]))
+        if (!toDouble(field, xyz[c]))
           fail("\"" + std::string(field) + "\" is not a number", int(column) + 1);
+        // "inf", "nan(...)" and values beyond the double range are no position: a gap.
+        if (!std::isfinite(xyz[c])) present = false;
       }
       if (present) m_rOut.samples.push_back({index, k, xyz[0], xyz[1], xyz[2]});
     }
@@ -228,7 +237,8 @@ bool parseTrc(const char* i_pText, size_t i_size, TrcContent& o_rContent, std::s
     TrcParser(i_pText, i_size, o_rContent).parse();
     return true;
   } catch (const TrcError& e) {
-    o_rError = e.message;
+    // Messages quote the file's text, which may hold NULs or control characters.
+    o_rError = C3D::printableText(e.message);
     return false;
   }
 }

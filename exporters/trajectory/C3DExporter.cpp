@@ -151,14 +151,23 @@ void C3DExporter::collectMarkers() {
   }
 }
 
+int C3DExporter::wholeRatio(double i_numerator, float i_frameRate) {
+  const float ratio = float(i_numerator) / i_frameRate;
+  // A rate that is n times the frame rate up to the rounding of a float counts as n: analog
+  // rates of files with a fractional frame rate (107.527 Hz) come back as such products.
+  const float nearest = std::nearbyint(ratio);
+  if (std::fabs(ratio - nearest) <= 1e-5f * std::max(1.0f, nearest)) return int(nearest);
+  return int(ratio);
+}
+
 void C3DExporter::computeAnalogFigures() {
-  m_analogRate = 0;
+  m_analogRate = 0.0;
   m_analogChannels = 0;
   for (const AudioSource* pSource : m_audioSources) {
     if (pSource->getSampleRate() > m_analogRate) m_analogRate = pSource->getSampleRate();
     m_analogChannels += pSource->getNumChannels();
   }
-  m_samplesPerFrame = int(float(m_analogRate) / m_frameRate);
+  m_samplesPerFrame = wholeRatio(m_analogRate, m_frameRate);
 }
 
 void C3DExporter::computeScale() {

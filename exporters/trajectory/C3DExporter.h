@@ -112,7 +112,8 @@ public:
   float getScale() const { return m_scale; }
   int getDataStartBlock() const { return m_dataStartBlock; }
   int getSamplesPerFrame() const { return m_samplesPerFrame; }
-  int getAnalogRate() const { return m_analogRate; }
+  /// The highest sample rate of the audio sources, as they give it (not rounded).
+  double getAnalogRate() const { return m_analogRate; }
   int getAnalogChannels() const { return m_analogChannels; }
   const TArray<HString>& getSubjectNames() const { return m_subjectNames; }
 
@@ -121,6 +122,9 @@ private:
   void rotateToDesiredAxis(bool i_wasZUp, bool i_undo);
   void collectMarkers();
   void computeAnalogFigures();
+  /// The truncation of a rate over the frame rate (in float, as the file's figures are), taken
+  /// as the nearest whole number when within float rounding of it.
+  static int wholeRatio(double i_numerator, float i_frameRate);
   void computeScale();
   /// The label of a marker under the current options; adds its subject prefix to the names.
   HString labelOf(const Marker* i_pMarker);
@@ -147,7 +151,7 @@ private:
   int64_t m_rangeStart = 0;
   TSimpleArray<AudioSource*> m_audioSources;
   int m_samplesPerFrame = 0;
-  int m_analogRate = 0;
+  double m_analogRate = 0.0;
   int m_analogChannels = 0;
   TArray<HString> m_subjectNames;
   TSimpleArray<const Marker*> m_markers;

@@ -37,7 +37,7 @@ void C3DExporter::writeHeader() {
   C3D::putU16LE(header + EPointCount, uint16_t(m_pointCount));
   // Channels times the rate over the frame rate, not channels times samples per frame.
   C3D::putU16LE(header + EAnalogPerFrame,
-                uint16_t(int(float(m_analogChannels * m_analogRate) / m_frameRate)));
+                uint16_t(wholeRatio(double(m_analogChannels) * m_analogRate, m_frameRate)));
   const int first = m_firstFrame >= 0xFFFF ? 0xFFFF : m_firstFrame;
   C3D::putU16LE(header + EFirstFrame, uint16_t(first));
   // A last frame past 16 bits repeats the first frame's word; DRU_LAST_FRAME holds the truth.

@@ -1,18 +1,37 @@
 #include "TrcExporter.h"
+#include "c3d/PrintableText.h"
 #include "plugin/host/Character.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/HInterface.h"
 #include "plugin/host/HTimeManager.h"
 #include "plugin/host/Marker.h"
 #include "plugin/host/OperationStack.h"
+#include <cmath>
 #include <cstring>
 #include <string>
 
 namespace {
 const char* const kSection = "TRCExporter";
 
+// Appends "\t%f" of a value in full: a double printed with six decimals takes up to 317
+// characters (309 digits before the point), so the buffer is sized for that, and a longer
+// result (which cannot happen) is formatted again into a buffer of its size.
+void appendValue(std::string& io_rLine, double i_value) {
+  char text[384];
+  const int n = std::snprintf(text, sizeof text, "\t%f", i_value);
+  if (n < 0) return;
+  if (size_t(n) < sizeof text) {
+    io_rLine.append(text, size_t(n));
+    return;
+  }
+  std::string wide(size_t(n) + 1, '\0');
+  std::snprintf(wide.data(), wide.size(), "\t%f", i_value);
+  io_rLine.append(wide.data(), size_t(n));
+}
+
 // Appends one "\t%f\t%f\t%f" triple, or the three tabs of a gap. A node that is not a marker
-// has a value at every time.
+// has a value at every time. A position with an infinite or NaN coordinate is written as a gap:
+// such text ("inf", "nan") is no coordinate to other readers of the format.
 void appendPosition(std::string& io_rLine, const Node* i_pNode, HTime i_t) {
   if (i_pNode->isKindOf(&Marker::s_classMarker) &&
       !static_cast<const Marker*>(i_pNode)->m_track.hasKeyAt(i_t)) {
@@ -20,9 +39,13 @@ void appendPosition(std::string& io_rLine, const Node* i_pNode, HTime i_t) {
     return;
   }
   const Vec3 p = i_pNode->getWSPos(i_t);
-  char text[160];
-  const int n = std::snprintf(text, sizeof text, "\t%f\t%f\t%f", p.x, p.y, p.z);
-  io_rLine.append(text, n > 0 ? static_cast<size_t>(n) : 0);
+  if (!std::isfinite(p.x) || !std::isfinite(p.y) || !std::isfinite(p.z)) {
+    io_rLine += "\t\t\t";
+    return;
+  }
+  appendValue(io_rLine, p.x);
+  appendValue(io_rLine, p.y);
+  appendValue(io_rLine, p.z);
 }
 } // namespace
 
@@ -120,8 +143,18 @@ void TrcExporter::writeHeader() {
   std::fprintf(m_pFile, "%d\n", frames);
 
   std::fprintf(m_pFile, "Frame#\tTime\t");
-  for (const Node* pMarker : m_markers)
-    std::fprintf(m_pFile, "%s\t\t\t", displayName(pMarker).GetStr());
+  for (const Node* pMarker : m_markers) {
+    // A tab, line end or other control character, or bytes that are not UTF-8, would break the
+    // header's columns or its text: they become '?', with a warning.
+    const HString name = displayName(pMarker);
+    bool changed = false;
+    const std::string text = C3D::printableText(name.GetString(), &changed);
+    if (changed)
+      g_db->logWarning("TRC export: a marker name holds characters that cannot be printed; "
+                       "written as \"%s\"",
+                       text.c_str());
+    std::fprintf(m_pFile, "%s\t\t\t", text.c_str());
+  }
   std::fprintf(m_pFile, "\n");
 
   std::fprintf(m_pFile, "\t\t");

@@ -229,4 +229,96 @@ TEST(C3DReader, MalformedFilesGiveClearErrors) {
   EXPECT_EQ(content.warnings.size(), 1u);
 }
 
+TEST(C3DReader, HeaderAndParameterScalesThatDisagree) {
+  // Integer frames written with 0.1 mm steps, coordinates up to about 3 m.
+  C3DTestFile file;
+  file.scale = 0.1f;
+  file.fillLinear(2, 3);
+  for (auto& frame : file.frames)
+    for (auto& point : frame)
+      point = {3000.0f, -1500.0f, 1000.0f, 0.0f};
+  // POINT:SCALE 2.56 times smaller: both are plausible sizes; the header's wins, with a warning.
+  file.parameterScale = 0.1f / 2.56f;
+  C3DContent content = parseOk(file.build());
+  EXPECT_FLOAT_EQ(content.scale, 0.1f);
+  EXPECT_NEAR(content.point(2, 1)[0], 3000.0f, 0.1f);
+  ASSERT_EQ(content.warnings.size(), 1u);
+  EXPECT_EQ(content.warnings[0].find("the header's point scale 0.1 and POINT:SCALE 0.0390625 "
+                                     "disagree; 0.1 is used"),
+            0u);
+
+  // A header scale that makes a 3 m volume 30 micrometres wide yields to the parameter.
+  C3DTestFile tiny = file;
+  tiny.parameterScale = 0.0f;
+  std::vector<uint8_t> bytes = tiny.build();
+  const std::vector<uint8_t> header = tiny.real(1e-6f);
+  std::copy(header.begin(), header.end(), bytes.begin() + 12);
+  content = parseOk(bytes);
+  EXPECT_FLOAT_EQ(content.scale, 0.1f);
+  EXPECT_NE(content.warnings.at(0).find("only it gives coordinates of a plausible size"),
+            std::string::npos);
+
+  // Signs that disagree: the form whose frames fill the data decides, either way round.
+  for (float written : {-1.0f, 0.25f}) {
+    C3DTestFile signs;
+    signs.scale = written;
+    signs.fillLinear(3, 40);
+    bytes = signs.build();
+    const std::vector<uint8_t> flipped = signs.real(-written);
+    std::copy(flipped.begin(), flipped.end(), bytes.begin() + 12);
+    content = parseOk(bytes);
+    EXPECT_EQ(content.scale, written);
+    EXPECT_FLOAT_EQ(content.point(39, 2)[0], 59.0f);
+    ASSERT_EQ(content.warnings.size(), 1u);
+    EXPECT_NE(content.warnings[0].find("fill the data"), std::string::npos);
+  }
+}
+
+TEST(C3DReader, DamagedNamesBecomePrintable) {
+  C3DTestFile file;
+  file.fillLinear(3, 2);
+  file.labels[1] = "L\aASI\xff";
+  file.labels[2] = "RASI\xe2\x82"; // a UTF-8 sequence cut short
+  file.analogSamplesPerFrame = 1;
+  file.analogLabels = {"F\x1bz"};
+  file.analog = {{1}, {2}};
+  C3DContent content = parseOk(file.build());
+  EXPECT_EQ(content.labels, (std::vector<std::string>{"M1", "L?ASI?", "RASI??"}));
+  EXPECT_EQ(content.analogLabels, std::vector<std::string>{"F?z"});
+  ASSERT_EQ(content.warnings.size(), 2u);
+  EXPECT_EQ(content.warnings[0], "2 point labels held characters that cannot be printed, "
+                                 "replaced by '?' (the first, number 2, reads \"L?ASI?\")");
+
+  // A damaged parameter name with a NUL and a BEL in it: the message is whole.
+  file.extras.push_back({1, std::string("USED\0\a", 6), 9, {}, {}});
+  const std::string error = parseError(file.build());
+  EXPECT_EQ(error.find("parameter USED?? has data type 9 (known: -1, 1, 2, 4) (byte "), 0u)
+      << error;
+  EXPECT_EQ(error.find('\0'), std::string::npos);
+}
+
+TEST(C3DReader, AnalogCalibrationIsRead) {
+  C3DTestFile file;
+  file.fillLinear(1, 2);
+  file.analogSamplesPerFrame = 2;
+  file.analogLabels = {"Fx", "EMG"};
+  file.analogOffsets = {10, 0};
+  file.analogReal = {{10.5f, 0.001f, 9.5f, -0.002f}, {10.25f, 0.0f, 10.0f, 0.003f}};
+  file.extras.push_back({2, "SCALE", 4, {2}, {}});
+  for (float v : {2.0f, 0.5f}) {
+    const auto b = file.real(v);
+    file.extras.back().data.insert(file.extras.back().data.end(), b.begin(), b.end());
+  }
+  file.extras.push_back({2, "GEN_SCALE", 4, {}, file.real(4.0f)});
+  file.extras.push_back({2, "UNITS", -1, {4, 2}, {'N', ' ', ' ', ' ', 'm', 'V', ' ', ' '}});
+  const C3DContent content = parseOk(file.build());
+  EXPECT_EQ(content.analogOffsets, (std::vector<double>{10.0, 0.0}));
+  EXPECT_EQ(content.analogScales, (std::vector<double>{8.0, 2.0}));
+  EXPECT_EQ(content.analogUnits, (std::vector<std::string>{"N", "mV"}));
+  // Readings at full precision, less the offset.
+  EXPECT_DOUBLE_EQ(content.analog[0], 0.5);
+  EXPECT_DOUBLE_EQ(content.analog[1], double(0.001f));
+  EXPECT_DOUBLE_EQ(content.analog[7], double(0.003f));
+}
+
 } // namespace

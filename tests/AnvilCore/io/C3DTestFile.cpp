@@ -69,7 +69,7 @@ std::vector<uint8_t> C3DTestFile::build() const {
     records.push_back({g, n, t, std::move(d), std::move(v)});
   };
   if (writeUsed) add(1, "USED", 2, {}, word(points));
-  add(1, "SCALE", 4, {}, real(scale));
+  add(1, "SCALE", 4, {}, real(parameterScale != 0.0f ? parameterScale : scale));
   add(1, "RATE", 4, {}, real(rate));
   add(1, "FRAMES", 2, {}, word(frameCount));
   for (int chunk = 0; chunk * 255 < std::max(points, 1); ++chunk) {
@@ -89,7 +89,8 @@ std::vector<uint8_t> C3DTestFile::build() const {
       offsets.insert(offsets.end(), w.begin(), w.end());
     }
     add(2, "OFFSET", 2, {channels}, offsets);
-    add(2, "RATE", 4, {}, real(rate * float(analogSamplesPerFrame)));
+    add(2, "RATE", 4, {},
+        real(analogRate != 0.0f ? analogRate : rate * float(analogSamplesPerFrame)));
   }
   if (!subjectPrefixes.empty()) {
     add(3, "USES_PREFIXES", 2, {}, word(1));
@@ -162,7 +163,12 @@ std::vector<uint8_t> C3DTestFile::build() const {
         file.insert(file.end(), bytes.begin(), bytes.end());
       }
     }
-    if (f < int(analog.size()))
+    if (f < int(analogReal.size()))
+      for (float value : analogReal[size_t(f)]) {
+        const auto bytes = real(value);
+        file.insert(file.end(), bytes.begin(), bytes.end());
+      }
+    else if (f < int(analog.size()))
       for (int value : analog[size_t(f)]) {
         const auto bytes = scale < 0.0f ? real(float(value)) : word(value);
         file.insert(file.end(), bytes.begin(), bytes.end());

@@ -24,6 +24,10 @@ struct C3DTestFile {
   std::vector<int> analogOffsets;
   /// Per frame, samplesPerFrame * channels raw values, sample by sample.
   std::vector<std::vector<int>> analog;
+  /// Per frame, as `analog`, for float files: used instead of `analog` when set.
+  std::vector<std::vector<float>> analogReal;
+  float analogRate = 0.0f;     ///< ANALOG:RATE when not 0 (else rate times samples per frame)
+  float parameterScale = 0.0f; ///< POINT:SCALE when not 0 (else `scale`, as in the header)
 
   struct Extra {
     int group; ///< 1 POINT, 2 ANALOG, 3 SUBJECTS, 4 TRIAL

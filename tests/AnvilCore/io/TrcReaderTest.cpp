@@ -6,6 +6,7 @@
 #include "plugin/host/HTimeManager.h"
 #include "plugin/host/Marker.h"
 #include <cmath>
+#include <limits>
 
 using namespace AnvilCore;
 
@@ -113,6 +114,40 @@ TEST(TrcReader, MalformedFilesNameTheLine) {
   };
   for (const Case& c : cases)
     EXPECT_EQ(parseError(c.text), c.error) << c.text;
+}
+
+TEST(TrcReader, ExtremesAndNonFiniteValues) {
+  const std::string head = std::string(kHeader) + "60\t60\t3\t2\tmm\t60\t1\t3\n" +
+                           "Frame#\tTime\tA\t\t\tB\t\t\t\n\t\tX1\tY1\tZ1\tX2\tY2\tZ2\n";
+  // Values beyond the double range and infinities are gaps, like "nan"; a value below the
+  // smallest denormal reads as zero, the smallest denormal as itself.
+  const TrcContent c = parseOk(head + "1\t0\t1e300\t-1e300\t4.9406564584124654e-324\t1\t1\t1\n"
+                                      "2\t0\tinf\t1\t1\t-INF\t1\t1\n"
+                                      "3\t0\t1e999\t1\t1\t1e-999\t-0\t1\n");
+  ASSERT_EQ(c.samples.size(), 3u);
+  EXPECT_EQ(c.samples[0].x, 1e300);
+  EXPECT_EQ(c.samples[0].y, -1e300);
+  EXPECT_EQ(c.samples[0].z, std::numeric_limits<double>::denorm_min());
+  EXPECT_EQ(c.samples[1].marker, 1);
+  EXPECT_EQ(c.samples[2].frame, 2);
+  EXPECT_TRUE(hasSample(c, 2, 1, 0.0));
+  EXPECT_FALSE(hasSample(c, 1, 0, 0.0));
+  EXPECT_FALSE(hasSample(c, 2, 0, 0.0));
+}
+
+TEST(TrcReader, DamagedNamesArePrintableAndMessagesWhole) {
+  const std::string head = std::string(kHeader) + "60\t60\t1\t2\tmm\t60\t1\t1\n";
+  const TrcContent c = parseOk(head + "Frame#\tTime\tL\x01"
+                                      "FHD\t\t\tR\xC3\x28\t\t\t\n\t\tX1\n1\t0\t1\t2\t3\n");
+  EXPECT_EQ(c.labels, (std::vector<std::string>{"L?FHD", "R?("}));
+  EXPECT_EQ(c.warnings.size(), 2u);
+  // A NUL inside the quoted text does not end the message.
+  const std::string names = "Frame#\tTime\tA\t\t\tB\n\t\tX1\n";
+  const std::string error = parseError(head + names +
+                                       std::string("1\t0\t1\t2\ta\0\x07"
+                                                   "b\n",
+                                                   13));
+  EXPECT_EQ(error, "line 6, column 5: \"a??b\" is not a number");
 }
 
 class TrcSceneReaderTest : public SceneReaderTest {};

@@ -2,9 +2,13 @@
 #include "exporters/trajectory/TrcExporter.h"
 #include "../../support/HostFixture.h"
 #include "../RunExport.h"
+#include "AnvilCore/io/TrcReader.h"
 #include "plugin/host/HInterface.h"
 #include "plugin/host/OperationStack.h"
+#include <algorithm>
+#include <cmath>
 #include <gtest/gtest.h>
+#include <limits>
 #include <memory>
 #include <sstream>
 
@@ -141,4 +145,39 @@ TEST_F(TrcExport, UserSetupKeysAndTheUnlabelledDefault) {
   ASSERT_TRUE(e.setOptions(&options));
   EXPECT_TRUE(e.getRemoveLeadingUnderscores());
   g_interface.clear();
+}
+
+TEST_F(TrcExport, ExtremeValuesAreWrittenWholeAndReadBack) {
+  const double tiny = std::numeric_limits<double>::denorm_min();
+  const double inf = std::numeric_limits<double>::infinity();
+  addMarker("big", {Vec3(1e300, -1e300, tiny), Vec3(inf, 1, 1), Vec3(1, std::nan(""), 1)});
+  addMarker("next", {Vec3(1, 2, 3), Vec3(4, 5, 6), Vec3(7, 8, 9)});
+  const std::string text = run();
+  const std::vector<std::string> rows = ExportTest::lines(text);
+  ASSERT_EQ(rows.size(), 8u);
+  // Every frame line keeps all of its columns: frame, time, three per marker.
+  for (size_t i = 5; i < rows.size(); ++i)
+    EXPECT_EQ(std::count(rows[i].begin(), rows[i].end(), '\t'), 7) << rows[i].substr(0, 80);
+
+  AnvilCore::TrcContent content;
+  std::string error;
+  ASSERT_TRUE(AnvilCore::parseTrc(text.data(), text.size(), content, error)) << error;
+  // Frame 0 of both markers, frame 1 and 2 of "next" only: non-finite positions are gaps.
+  ASSERT_EQ(content.samples.size(), 4u);
+  EXPECT_EQ(content.samples[0].x, 1e300);
+  EXPECT_EQ(content.samples[0].y, -1e300);
+  EXPECT_EQ(content.samples[0].z, 0.0); // six decimals, as every value of the format
+  EXPECT_EQ(content.samples[1].marker, 1);
+  EXPECT_EQ(content.samples[2].marker, 1);
+  EXPECT_EQ(content.samples[3].z, 9.0);
+}
+
+TEST_F(TrcExport, UnprintableNamesAreReplacedWithAWarning) {
+  addMarker("L\tFH\xff\x07", {Vec3(), Vec3(), Vec3()});
+  LogCapture log;
+  const std::vector<std::string> rows = ExportTest::lines(run());
+  ASSERT_GE(rows.size(), 4u);
+  EXPECT_EQ(rows[3], "Frame#\tTime\tL?FH??\t\t\t");
+  ASSERT_EQ(log.warnings().size(), 1u);
+  EXPECT_NE(log.warnings()[0].find("\"L?FH??\""), std::string::npos);
 }
