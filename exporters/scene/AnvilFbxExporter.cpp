@@ -49,8 +49,9 @@ void noneModeRates(int i_r, double i_rate, std::vector<double>& o_rRates) {
   }
   if (i_rate > 96.0 && i_r % 24 == 0) {
     o_rRates.push_back(24);
+    // 96 goes with 48: a rate of 240 lists 24, 48 and 96.
     if (i_r % 48 == 0) o_rRates.push_back(48);
-    if (i_r % 96 == 0) o_rRates.push_back(96);
+    if (i_r % 48 == 0) o_rRates.push_back(96);
   }
   if (i_rate > 120.0 && i_r % 30 == 0) {
     o_rRates.push_back(30);

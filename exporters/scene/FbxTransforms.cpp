@@ -58,7 +58,9 @@ AnvilFbx::EFbxRotationOrder rotationOrder(AnvilRotation::RotOrder i_order) {
 
 Frame parentCorrection(const Node* i_pNode, const Node* i_pFbxParentHost) {
   const Node* pHostParent = hostParent(i_pNode);
-  if (pHostParent == i_pFbxParentHost) return Frame{};
+  // Same parent: the same frame. At the top both are "no parent", but the host's top is turned
+  // by the scene rotation and the FBX root is not.
+  if (pHostParent && pHostParent == i_pFbxParentHost) return Frame{};
   const Frame host = pHostParent ? worldOf(pHostParent) : Frame{sceneRotation(), Vec3()};
   const Frame fbx = i_pFbxParentHost ? worldOf(i_pFbxParentHost) : Frame{};
   const Frame toFbx = inverse(fbx);

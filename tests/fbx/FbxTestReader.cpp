@@ -66,19 +66,42 @@ public:
     Property p;
     p.type = get<char>();
     switch (p.type) {
-    case 'Y': p.integer = get<int16_t>(); break;
-    case 'C': p.integer = get<uint8_t>(); break;
-    case 'I': p.integer = get<int32_t>(); break;
-    case 'L': p.integer = get<int64_t>(); break;
-    case 'F': p.real = get<float>(); break;
-    case 'D': p.real = get<double>(); break;
+    case 'Y':
+      p.integer = get<int16_t>();
+      break;
+    case 'C':
+      p.integer = get<uint8_t>();
+      break;
+    case 'I':
+      p.integer = get<int32_t>();
+      break;
+    case 'L':
+      p.integer = get<int64_t>();
+      break;
+    case 'F':
+      p.real = get<float>();
+      break;
+    case 'D':
+      p.real = get<double>();
+      break;
     case 'S':
-    case 'R': p.text = bytes(get<uint32_t>()); break;
-    case 'f': array<float>(p); break;
-    case 'd': array<double>(p); break;
-    case 'i': array<int32_t>(p); break;
-    case 'l': array<int64_t>(p); break;
-    default: fail(std::string("unknown property type '") + p.type + "'");
+    case 'R':
+      p.text = bytes(get<uint32_t>());
+      break;
+    case 'f':
+      array<float>(p);
+      break;
+    case 'd':
+      array<double>(p);
+      break;
+    case 'i':
+      array<int32_t>(p);
+      break;
+    case 'l':
+      array<int64_t>(p);
+      break;
+    default:
+      fail(std::string("unknown property type '") + p.type + "'");
     }
     return p;
   }
@@ -177,11 +200,13 @@ File parse(const std::vector<uint8_t>& i_rBytes) {
 File read(const std::string& i_rPath) {
   std::ifstream in(i_rPath, std::ios::binary);
   if (!in) throw std::runtime_error("cannot open " + i_rPath);
-  std::vector<uint8_t> bytes((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
+  std::vector<uint8_t> bytes((std::istreambuf_iterator<char>(in)),
+                             std::istreambuf_iterator<char>());
   return parse(bytes);
 }
 
-Scene::Scene(const File& i_rFile) {
+Scene::Scene(File i_file) : m_file(std::move(i_file)) {
+  const File& i_rFile = m_file;
   const Node* pObjects = i_rFile.section("Objects");
   if (!pObjects) throw std::runtime_error("no Objects");
   for (const Node& n : pObjects->children) {

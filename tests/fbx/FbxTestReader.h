@@ -11,12 +11,12 @@ namespace FbxTest {
 
 struct Property {
   char type = 0;
-  int64_t integer = 0;             // Y C I L
-  double real = 0.0;               // F D
-  std::string text;                // S R
-  std::vector<double> reals;       // f d
-  std::vector<int64_t> integers;   // i l
-  bool compressed = false;         // an array stored with zlib
+  int64_t integer = 0;           // Y C I L
+  double real = 0.0;             // F D
+  std::string text;              // S R
+  std::vector<double> reals;     // f d
+  std::vector<int64_t> integers; // i l
+  bool compressed = false;       // an array stored with zlib
 };
 
 struct Node {
@@ -55,7 +55,10 @@ struct Object {
 /// The objects and connections of a file, indexed.
 class Scene {
 public:
-  explicit Scene(const File& i_rFile);
+  /// Keeps its own copy of the file: objects point into it.
+  explicit Scene(File i_file);
+  Scene(const Scene&) = delete;
+  Scene& operator=(const Scene&) = delete;
   std::vector<const Object*> ofType(const std::string& i_rRecordName) const;
   const Object* byId(int64_t i_id) const;
   /// The Model of that name, or null.
@@ -72,6 +75,7 @@ public:
   static std::vector<double> keyValues(const Node& i_rCurve);
 
 private:
+  File m_file;
   std::vector<Object> m_objects;
   std::map<int64_t, size_t> m_byId;
   std::multimap<int64_t, std::pair<int64_t, std::string>> m_sources; // parent -> (child, prop)

@@ -52,8 +52,9 @@ TEST_P(UnrollTest, KeepsEveryRotationAndRemovesJumps) {
   double largestJump = 0.0;
   for (int k = 1; k < 200; ++k)
     for (int a = 0; a < 3; ++a)
-      largestJump = std::max(largestJump, double(std::fabs(curves[a]->KeyGetValue(k) -
-                                                           curves[a]->KeyGetValue(k - 1))));
+      largestJump =
+          std::max(largestJump,
+                   double(std::fabs(curves[a]->KeyGetValue(k) - curves[a]->KeyGetValue(k - 1))));
   ASSERT_GE(largestJump, 180.0);
   FbxAnimCurveFilterUnroll filter;
   filter.SetRotationOrder(GetParam().fbx);

@@ -17,9 +17,9 @@ using namespace AnvilFbx;
 namespace {
 
 std::vector<uint8_t> bytesOf(const VFbxByteSink& i_rSink) {
-  std::string path = (std::filesystem::temp_directory_path() /
-                      ("anvil-fbx-sink-" + std::to_string(::getpid())))
-                         .string();
+  std::string path =
+      (std::filesystem::temp_directory_path() / ("anvil-fbx-sink-" + std::to_string(::getpid())))
+          .string();
   std::FILE* pFile = std::fopen(path.c_str(), "wb");
   EXPECT_TRUE(i_rSink.writeTo(pFile));
   std::fclose(pFile);
@@ -150,9 +150,9 @@ TEST(FbxExporterLayerTest, VersionStringsAndOutputs) {
   ASSERT_TRUE(pExporter->Export(pScene));
   const FbxTest::File file = FbxTest::read(path);
   EXPECT_EQ(file.version, 7400u);
-  for (const char* pSection : {"FBXHeaderExtension", "FileId", "CreationTime", "Creator",
-                               "GlobalSettings", "Documents", "References", "Definitions",
-                               "Objects", "Connections", "Takes"})
+  for (const char* pSection :
+       {"FBXHeaderExtension", "FileId", "CreationTime", "Creator", "GlobalSettings", "Documents",
+        "References", "Definitions", "Objects", "Connections", "Takes"})
     EXPECT_NE(file.section(pSection), nullptr) << pSection;
   EXPECT_EQ(file.section("FileId")->props[0].text,
             std::string(reinterpret_cast<const char*>(kFbxFileId), 16));
