@@ -2,7 +2,9 @@
 // transforms, camera and light, time mode, axes, curves, and the options that shape them.
 #include "FbxExportFixture.h"
 #include "plugin/host/NLEClip.h"
+#include <fstream>
 #include <gtest/gtest.h>
+#include <sys/wait.h>
 
 using namespace FbxExportTest;
 using ExportTest::Owned;
@@ -306,6 +308,58 @@ TEST(FbxExporterScenes, TimeModesFollowTheClock) {
       EXPECT_EQ(log.warnings().size(), 1u);
     }
   }
+}
+
+} // namespace
+
+namespace {
+
+TEST(FbxExporterFailures, AFailedExportKeepsTheOldFileAndLeavesNothingBeside) {
+  buildScene();
+  g_db->getTimeManager()->setTimecodeMode(4); // film at 100 fps: refused
+  const std::filesystem::path dir = ExportTest::tempPath("keep");
+  std::filesystem::create_directories(dir);
+  const std::string path = (dir / "old.fbx").string();
+  { std::ofstream(path) << "old bytes"; }
+  Owned<AnvilFbxExporter> exporter(AnvilFbxExporter::createInstance());
+  HostTest::LogCapture log;
+  AnvilCore::ExportRequest request;
+  request.path = path;
+  std::string error;
+  EXPECT_EQ(AnvilCore::runExport(*exporter, request, error),
+            AnvilCore::EExportStatus::EWriteFailed);
+  EXPECT_EQ(log.errors().front(), "Film may only be exported at 24, 48, 96, or 120.");
+  EXPECT_EQ(ExportTest::readText(path), "old bytes");
+  EXPECT_EQ(std::distance(std::filesystem::directory_iterator(dir),
+                          std::filesystem::directory_iterator()),
+            1);
+  EXPECT_FALSE(g_db->isSceneRotated());
+}
+
+TEST(FbxExporterFailures, AnUnwritablePathExitsOneWithAMessage) {
+  const std::string dir = ExportTest::tempPath("cli");
+  std::filesystem::create_directories(dir);
+  // A folder where the file should be: the finished file cannot replace it.
+  const std::string blocked = dir + "/blocked.fbx";
+  std::filesystem::create_directories(blocked);
+  for (const std::string& target : {dir + "/missing/demo.fbx", blocked}) {
+    const std::string command = std::string(ANVIL_BIN_DIR) + "/anvil export demo --user-setup " +
+                                dir + "/setup.ini -o " + target + " 2>&1";
+    FILE* pPipe = ::popen(command.c_str(), "r");
+    ASSERT_NE(pPipe, nullptr);
+    std::string output;
+    char buffer[4096];
+    for (size_t n; (n = std::fread(buffer, 1, sizeof buffer, pPipe)) > 0;)
+      output.append(buffer, n);
+    const int status = ::pclose(pPipe);
+    EXPECT_EQ(WEXITSTATUS(status), 1) << output;
+    EXPECT_NE(output.find(target), std::string::npos) << output;
+  }
+  EXPECT_TRUE(std::filesystem::is_directory(blocked));
+  EXPECT_FALSE(std::filesystem::exists(dir + "/missing"));
+  // Nothing but the blocked folder and the user setup is left in the folder.
+  for (const auto& entry : std::filesystem::directory_iterator(dir))
+    EXPECT_TRUE(entry.path() == blocked || entry.path().filename() == "setup.ini") << entry.path();
 }
 
 } // namespace
