@@ -38,8 +38,9 @@ void* operator new(size_t i_size) {
   return p;
 }
 void operator delete(void* i_p) noexcept {
-  if (i_p) s_live -= int64_t(malloc_usable_size(i_p));
-  std::free(i_p);
+  if (!i_p) return;
+  s_live -= int64_t(malloc_usable_size(i_p));
+  std::free(i_p); // every operator new of this program allocates with malloc
 }
 void operator delete(void* i_p, size_t) noexcept {
   operator delete(i_p);
@@ -129,7 +130,7 @@ public:
     ConsoleReporter::ReportRuns(i_runs);
   }
   void printRatios() const {
-    const auto exported = m_seconds.find("BM_FbxExport");
+    const auto exported = m_seconds.find("BM_FbxExport/iterations:2");
     const auto floor = m_seconds.find("BM_PlainFwrite");
     if (exported != m_seconds.end() && floor != m_seconds.end())
       std::printf("FBX export / plain fwrite of the same bytes: %.2f\n",

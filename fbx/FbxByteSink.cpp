@@ -9,7 +9,7 @@ void VFbxByteSink::append(const void* i_pData, size_t i_size) {
   while (i_size > 0) {
     const size_t offset = size_t(m_size % kBlockSize);
     if (offset == 0 && m_size / kBlockSize == m_blocks.size())
-      m_blocks.push_back(std::make_unique<uint8_t[]>(kBlockSize));
+      m_blocks.push_back(std::unique_ptr<uint8_t[]>(new uint8_t[kBlockSize])); // no zero fill
     const size_t n = std::min(i_size, kBlockSize - offset);
     std::memcpy(m_blocks[size_t(m_size / kBlockSize)].get() + offset, p, n);
     m_size += n;
