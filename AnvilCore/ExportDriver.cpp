@@ -66,10 +66,16 @@ EExportStatus runExport(FileExporter& i_rExporter, const ExportRequest& i_rReque
   i_rExporter.setStream(nullptr);
 
   if (!ok) {
+    // The exporter may have stopped because its stream failed, or, writing by path, failed
+    // quietly: the file layer knows why.
+    std::fflush(pStream);
+    const int streamError = output.WriteError();
     output.Abandon();
-    // An exporter that writes by path may fail quietly; the file layer knows why.
     const UtilsFileSystem::VReplaceFailure& failure = UtilsFileSystem::LastReplaceFailure();
-    if (!failure.m_Reason.empty())
+    if (streamError)
+      o_rError = "error writing '" + i_rRequest.path + "': " +
+                 UtilsFileSystem::DescribeError(streamError);
+    else if (!failure.m_Reason.empty())
       o_rError = "error writing '" + failure.m_Target + "': " + failure.m_Reason;
     return EExportStatus::EWriteFailed;
   }

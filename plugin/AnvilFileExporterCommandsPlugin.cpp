@@ -1,5 +1,6 @@
 #include "AnvilFileExporterCommandsPlugin.h"
 #include "commands/C3dExportOptionsCmd.h"
+#include "commands/FbxExportOptionsCmd.h"
 #include "commands/KmfExportOptionsCmd.h"
 #include "commands/KmrExportOptionsCmd.h"
 #include "commands/KmsExportOptionsCmd.h"
@@ -15,6 +16,7 @@ AnvilFileExporterCommandsPlugin* AnvilFileExporterCommandsPlugin::createInstance
 bool AnvilFileExporterCommandsPlugin::loadCommands() {
   // Option commands join here, in the host's order, as their exporters gain them.
   m_commands.add(new (std::nothrow) C3dExportOptionsCmd());
+  m_commands.add(new (std::nothrow) FbxExportOptionsCmd());
 
   m_commands.add(new (std::nothrow) TrcExportOptionsCmd());
   m_commands.add(new (std::nothrow) KmtExportOptionsCmd());

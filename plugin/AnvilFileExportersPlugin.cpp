@@ -1,5 +1,6 @@
 #include "AnvilFileExportersPlugin.h"
 #include "exporters/camera/XCPExporter.h"
+#include "exporters/scene/AnvilFbxExporter.h"
 #include "exporters/scene/USDExporter.h"
 #include "exporters/subject/KmfExporter.h"
 #include "exporters/subject/KmrExporter.h"
@@ -18,6 +19,7 @@ bool AnvilFileExportersPlugin::loadExporters() {
   m_exporters.add(C3DExporter::createInstance());
   m_exporters.add(CsmExporter::createInstance());
   m_exporters.add(TrcExporter::createInstance());
+  m_exporters.add(AnvilFbxExporter::createInstance());
   m_exporters.add(KmfExporter::createInstance());
   m_exporters.add(KmtExporter::createInstance());
   m_exporters.add(KmsExporter::createInstance());

@@ -210,6 +210,10 @@ bool VReplacingFile::Write(const void* pBuffer, std::size_t size) {
   return size == 0 || std::fwrite(pBuffer, size, 1, m_pFile) == 1;
 }
 
+int VReplacingFile::WriteError() const {
+  return m_pCookie ? m_pCookie->m_FirstError : 0;
+}
+
 std::uint64_t VReplacingFile::Size() const {
   if (!m_pFile) return 0;
   std::fflush(m_pFile);

@@ -34,6 +34,8 @@ public:
   std::FILE* File() const { return m_pFile; }
   /// fwrite of a whole block; false once any write has failed.
   bool Write(const void* pBuffer, std::size_t size);
+  /// The errno of the first write that failed so far; 0 when none has.
+  int WriteError() const;
   /// Bytes the stream holds so far (its position at the end), flushed or not.
   std::uint64_t Size() const;
 

@@ -1,0 +1,156 @@
+// FBX export of the long take (200 markers x 36,000 frames) plus one 60-bone skeleton animated
+// over the same frames, against writing the same number of bytes with one plain fwrite. Prints
+// the time ratio, and the peak memory the export allocates against the key data the FBX layer
+// holds (8-byte time, 4-byte value and 4-byte flags per key).
+#include "AnvilCore/ExportDriver.h"
+#include "LongTake.h"
+#include "exporters/scene/AnvilFbxExporter.h"
+#include "plugin/host/SolvingBone.h"
+#include "plugin/host/SolvingSetup.h"
+#include "plugin/host/SubjectManager.h"
+#include <atomic>
+#include <benchmark/benchmark.h>
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
+#include <malloc.h>
+#include <map>
+#include <new>
+#include <vector>
+
+// Allocation accounting for the memory ratio: bytes live now and the peak since the last reset.
+namespace {
+std::atomic<int64_t> s_live{0};
+std::atomic<int64_t> s_peak{0};
+void noteAllocation(void* i_p) {
+  if (!i_p) return;
+  const int64_t now = s_live += int64_t(malloc_usable_size(i_p));
+  int64_t peak = s_peak.load();
+  while (now > peak && !s_peak.compare_exchange_weak(peak, now)) {
+  }
+}
+} // namespace
+
+void* operator new(size_t i_size) {
+  void* p = std::malloc(i_size ? i_size : 1);
+  if (!p) throw std::bad_alloc();
+  noteAllocation(p);
+  return p;
+}
+void operator delete(void* i_p) noexcept {
+  if (!i_p) return;
+  s_live -= int64_t(malloc_usable_size(i_p));
+  std::free(i_p); // every operator new of this program allocates with malloc
+}
+void operator delete(void* i_p, size_t) noexcept {
+  operator delete(i_p);
+}
+void* operator new[](size_t i_size) {
+  return operator new(i_size);
+}
+void operator delete[](void* i_p) noexcept {
+  operator delete(i_p);
+}
+void operator delete[](void* i_p, size_t) noexcept {
+  operator delete(i_p);
+}
+
+namespace {
+using namespace Bench;
+constexpr int kBones = 60;
+
+void buildScene() {
+  static bool s_built = false;
+  if (s_built) return;
+  s_built = true;
+  longTake({"M", "Walker", false});
+  Character* pWalker = g_db->getSubjectManager()->getSubject(0);
+  SolvingSetup* pSetup = pWalker->getSolvingSetup(true);
+  const int64_t tpf = g_db->getTimeManager()->getTicksPerFrame();
+  Module* pParent = pSetup;
+  for (int b = 0; b < kBones; ++b) {
+    auto* pBone = new SolvingBone(HString("Bone" + std::to_string(b)));
+    pBone->setPreTranslation(Vec3(0.0, 0.0, 100.0));
+    pBone->m_rotationTrack.reserve(kFrames);
+    for (int f = 0; f < kFrames; ++f)
+      pBone->m_rotationTrack.setKey(f * tpf, AnvilRotation(Vec3(std::sin(b), 1.0, std::cos(b)),
+                                                           30.0 * std::sin(f * 0.02 + b)));
+    g_db->addChild(pParent, pBone);
+    // A chain of five, then back to the setup: twelve limbs of five bones.
+    pParent = (b % 5 == 4) ? static_cast<Module*>(pSetup) : pBone;
+  }
+}
+
+// Keys the FBX layer holds: three curves per animated property.
+int64_t heldKeyBytes() {
+  return int64_t(kMarkers + kBones) * 3 * kFrames * (8 + 4 + 4);
+}
+
+uintmax_t s_bytes = 0;
+double s_memoryRatio = 0.0;
+
+void BM_FbxExport(benchmark::State& state) {
+  buildScene();
+  AnvilFbxExporter* pExporter = AnvilFbxExporter::createInstance();
+  AnvilCore::ExportRequest request;
+  request.path = tempOutput(".fbx");
+  std::string error;
+  for (auto _ : state) {
+    const int64_t before = s_live.load();
+    s_peak = before;
+    if (AnvilCore::runExport(*pExporter, request, error) != AnvilCore::EExportStatus::EOk)
+      state.SkipWithError(error.c_str());
+    s_memoryRatio = double(s_peak.load() - before) / double(heldKeyBytes());
+  }
+  s_bytes = std::filesystem::file_size(request.path);
+  state.SetBytesProcessed(int64_t(state.iterations()) * int64_t(s_bytes));
+  state.counters["file MB"] = double(s_bytes) / 1e6;
+  std::filesystem::remove(request.path);
+  pExporter->deleteThis();
+}
+
+// The floor: the file's size in one fwrite.
+void BM_PlainFwrite(benchmark::State& state) {
+  std::vector<uint8_t> bytes(s_bytes, 1);
+  const std::string path = tempOutput(".raw");
+  for (auto _ : state) {
+    FILE* pFile = std::fopen(path.c_str(), "wb");
+    std::fwrite(bytes.data(), 1, bytes.size(), pFile);
+    std::fclose(pFile);
+  }
+  state.SetBytesProcessed(int64_t(state.iterations()) * int64_t(s_bytes));
+  std::filesystem::remove(path);
+}
+
+class RatioReporter : public benchmark::ConsoleReporter {
+public:
+  void ReportRuns(const std::vector<Run>& i_runs) override {
+    for (const Run& run : i_runs)
+      m_seconds[run.benchmark_name()] = run.GetAdjustedRealTime();
+    ConsoleReporter::ReportRuns(i_runs);
+  }
+  void printRatios() const {
+    const auto exported = m_seconds.find("BM_FbxExport/iterations:2");
+    const auto floor = m_seconds.find("BM_PlainFwrite");
+    if (exported != m_seconds.end() && floor != m_seconds.end())
+      std::printf("FBX export / plain fwrite of the same bytes: %.2f\n",
+                  exported->second / floor->second);
+    std::printf("FBX export peak memory / key data held: %.2f\n", s_memoryRatio);
+  }
+
+private:
+  std::map<std::string, double> m_seconds;
+};
+} // namespace
+
+BENCHMARK(BM_FbxExport)->Unit(benchmark::kMillisecond)->Iterations(2);
+BENCHMARK(BM_PlainFwrite)->Unit(benchmark::kMillisecond);
+
+int main(int argc, char** argv) {
+  benchmark::Initialize(&argc, argv);
+  RatioReporter reporter;
+  benchmark::RunSpecifiedBenchmarks(&reporter);
+  reporter.printRatios();
+  benchmark::Shutdown();
+  return 0;
+}
