@@ -25,8 +25,9 @@ struct ExportRequest {
 
 /// Runs one export the way the host does: open the stream, fill the module list and range,
 /// `reset`, `write`, close. The file appears only when `write` succeeds: the stream goes to a
-/// sibling temporary file that replaces the output at the end. `o_rError` explains a failure
-/// that the exporter did not log itself.
+/// sibling temporary file that replaces the output once every byte is on disk. On a failure
+/// `o_rError` names the file and the reason ("error writing 'take.c3d': disk full") whenever
+/// the file layer knows it, whether the exporter wrote to the stream or by path.
 EExportStatus runExport(FileExporter& i_rExporter, const ExportRequest& i_rRequest,
                         std::string& o_rError);
 
