@@ -35,7 +35,8 @@ std::array<std::uint8_t, 16> RandomBytes16() {
 
 std::uint64_t NewFlowStoreId() {
   std::uint64_t id = 0;
-  while (id == 0) id = FlowStoreIdFromBytes(RandomBytes16());
+  while (id == 0)
+    id = FlowStoreIdFromBytes(RandomBytes16());
   return id;
 }
 

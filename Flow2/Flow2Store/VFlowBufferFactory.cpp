@@ -31,7 +31,8 @@ ZMT::IFlowBuffer* VFlowBufferFactory::AllocateChain(std::uint64_t size) {
   try {
     do {
       ZMT::IFlowBuffer* pPage = AllocatePage();
-      const std::uint64_t piece = size < VFlowBufferFixed::Capacity ? size : VFlowBufferFixed::Capacity;
+      const std::uint64_t piece =
+          size < VFlowBufferFixed::Capacity ? size : VFlowBufferFixed::Capacity;
       pPage->SetSize(piece);
       size -= piece;
       if (pTail)
@@ -47,7 +48,8 @@ ZMT::IFlowBuffer* VFlowBufferFactory::AllocateChain(std::uint64_t size) {
   return pHead;
 }
 
-ZMT::IFlowBuffer* VFlowBufferFactory::WrapShared(std::shared_ptr<const ZMT::IBufferConst> i_pBuffer) {
+ZMT::IFlowBuffer*
+VFlowBufferFactory::WrapShared(std::shared_ptr<const ZMT::IBufferConst> i_pBuffer) {
   VFlowBufferShared* pPage = m_SharedPages.Get();
   pPage->Wrap(std::move(i_pBuffer));
   AddReference();

@@ -59,7 +59,9 @@ class VFlowBufferShared final : public VFlowBufferCommon {
 public:
   explicit VFlowBufferShared(VFlowBufferFactory* i_pFactory) : m_pFactory(i_pFactory) {}
 
-  const std::uint8_t* GetData() const override { return m_pShared ? m_pShared->GetData() : nullptr; }
+  const std::uint8_t* GetData() const override {
+    return m_pShared ? m_pShared->GetData() : nullptr;
+  }
   std::uint64_t GetSize() const override { return m_pShared ? m_pShared->GetSize() : 0; }
   std::uint64_t GetCapacity() const override { return GetSize(); }
   std::shared_ptr<const ZMT::IBufferConst> GetSharedBuffer() const override { return m_pShared; }
@@ -68,7 +70,9 @@ public:
   /// Writable only when nobody else holds the wrapped buffer and it is itself writable.
   std::uint8_t* GetMutableData() override;
 
-  void Wrap(std::shared_ptr<const ZMT::IBufferConst> i_pShared) { m_pShared = std::move(i_pShared); }
+  void Wrap(std::shared_ptr<const ZMT::IBufferConst> i_pShared) {
+    m_pShared = std::move(i_pShared);
+  }
   void Reset() {
     m_pShared.reset();
     m_pNext = nullptr;
@@ -97,7 +101,8 @@ private:
     return reinterpret_cast<std::uint8_t*>(const_cast<VInPlaceBuffer*>(this)) + HeaderSize();
   }
   static constexpr std::size_t HeaderSize() {
-    return (sizeof(VInPlaceBuffer) + alignof(std::max_align_t) - 1) & ~(alignof(std::max_align_t) - 1);
+    return (sizeof(VInPlaceBuffer) + alignof(std::max_align_t) - 1) &
+           ~(alignof(std::max_align_t) - 1);
   }
 
   std::uint64_t m_Size;

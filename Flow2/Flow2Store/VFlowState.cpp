@@ -21,7 +21,9 @@ auto Key(const VFlowStateRecord& record) {
                          record.m_Token.m_ItemId, record.m_Token.m_FlowStoreId);
 }
 
-bool RecordLess(const VFlowStateRecord& a, const VFlowStateRecord& b) { return Key(a) < Key(b); }
+bool RecordLess(const VFlowStateRecord& a, const VFlowStateRecord& b) {
+  return Key(a) < Key(b);
+}
 
 bool TokenLess(const IFlowItemToken& a, const IFlowItemToken& b) {
   return std::tie(a.m_TypeId, a.m_ItemId, a.m_FlowStoreId) <
@@ -59,7 +61,8 @@ void VFlowState::Count(const VFlowStateRecord& record, int sign) {
 
 void VFlowState::Recount() {
   m_BeforeCount = m_AfterCount = 0;
-  for (const VFlowStateRecord& record : m_Records) Count(record, 1);
+  for (const VFlowStateRecord& record : m_Records)
+    Count(record, 1);
 }
 
 std::pair<std::size_t, std::size_t> VFlowState::TypeRange(std::uint32_t typeId) const {
@@ -124,7 +127,8 @@ void VFlowState::SetAbsoluteReference(const VFlowTimestamp& time) {
 }
 
 void VFlowState::ShiftTime(std::int64_t delta, bool shiftPeriodic, bool shiftAbsolute) {
-  for (VFlowStateRecord& record : m_Records) record.m_Time.m_Tick += delta;
+  for (VFlowStateRecord& record : m_Records)
+    record.m_Time.m_Tick += delta;
   m_Time.m_Tick += delta;
   if (shiftPeriodic && !m_PeriodicReference.IsEmpty())
     m_PeriodicReference.m_Tick =
@@ -133,7 +137,9 @@ void VFlowState::ShiftTime(std::int64_t delta, bool shiftPeriodic, bool shiftAbs
   ++m_Revision;
 }
 
-VRecordPosition VFlowState::LowerBound(std::uint32_t typeId) const { return TypeRange(typeId).first; }
+VRecordPosition VFlowState::LowerBound(std::uint32_t typeId) const {
+  return TypeRange(typeId).first;
+}
 
 VRecordPosition VFlowState::UpperBound(std::uint32_t typeId) const {
   return TypeRange(typeId).second;
@@ -183,7 +189,8 @@ void VFlowState::Clear() {
 void VFlowState::Erase(VRecordPosition first, VRecordPosition last) {
   last = std::min(last, m_Records.size());
   if (first >= last) return;
-  for (std::size_t i = first; i < last; ++i) Count(m_Records[i], -1);
+  for (std::size_t i = first; i < last; ++i)
+    Count(m_Records[i], -1);
   m_Records.erase(m_Records.begin() + first, m_Records.begin() + last);
   ++m_Revision;
 }
@@ -270,7 +277,8 @@ void VFlowState::GetTokens(ZMT::VTokens& o_rTokens, std::uint32_t typeId, EMatch
 
 void VFlowState::GetTokens(ZMT::VTokens& o_rTokens) const {
   o_rTokens.clear();
-  for (const VFlowStateRecord& record : m_Records) o_rTokens.push_back(record.m_Token);
+  for (const VFlowStateRecord& record : m_Records)
+    o_rTokens.push_back(record.m_Token);
   SortUnique(o_rTokens);
 }
 
@@ -416,9 +424,13 @@ bool VFlowState::Merge(const ZMT::IFlowState& other) {
   return true;
 }
 
-void VFlowState::Reserve(std::size_t count) { m_Records.reserve(count); }
+void VFlowState::Reserve(std::size_t count) {
+  m_Records.reserve(count);
+}
 
-ZMT::IFlowStateFactory* VFlowState::GetFactory() const { return m_pFactory; }
+ZMT::IFlowStateFactory* VFlowState::GetFactory() const {
+  return m_pFactory;
+}
 
 void VFlowState::ShiftSession(std::int32_t delta) {
   auto shift = [delta](VFlowTimestamp& time) {
@@ -427,7 +439,8 @@ void VFlowState::ShiftSession(std::int32_t delta) {
   shift(m_Time);
   shift(m_PeriodicReference);
   shift(m_AbsoluteReference);
-  for (VFlowStateRecord& record : m_Records) shift(record.m_Time);
+  for (VFlowStateRecord& record : m_Records)
+    shift(record.m_Time);
   std::sort(m_Records.begin(), m_Records.end(), RecordLess);
   Recount();
   ++m_Revision;

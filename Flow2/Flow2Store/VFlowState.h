@@ -49,7 +49,8 @@ public:
   }
   bool GetItem(ZMT::IFlowItemHandle& o_rItem, std::uint32_t typeId, ZMT::EMatch match,
                const ZMT::VFlowTimestamp& time) const override;
-  bool GetItem(ZMT::IFlowItemHandle& o_rItem, std::uint32_t typeId, ZMT::EMatch match) const override {
+  bool GetItem(ZMT::IFlowItemHandle& o_rItem, std::uint32_t typeId,
+               ZMT::EMatch match) const override {
     return GetItem(o_rItem, typeId, match, m_Time);
   }
   std::size_t CountItems(std::uint32_t typeId, ZMT::EMatch match,

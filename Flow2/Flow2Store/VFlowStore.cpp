@@ -65,7 +65,8 @@ IResult VFlowStore::GetFlowStoreId(std::uint64_t& o_rId) const {
 
 IResult VFlowStore::GetTypeIds(std::vector<std::uint32_t>& o_rIds) const {
   o_rIds.clear();
-  for (const auto& [typeId, pStore] : m_TypesById) o_rIds.push_back(typeId);
+  for (const auto& [typeId, pStore] : m_TypesById)
+    o_rIds.push_back(typeId);
   return IResult::Ok;
 }
 
@@ -108,7 +109,8 @@ IResult VFlowStore::FindItem(const ZMT::IFlowItemToken& token, ZMT::IFlowItemHan
   return pStore ? pStore->FindItem(token, o_rItem) : IResult(IResult::InvalidToken);
 }
 
-IResult VFlowStore::GetOrCreateItem(const ZMT::IFlowItemToken& token, ZMT::IFlowBufferConst* i_pBytes,
+IResult VFlowStore::GetOrCreateItem(const ZMT::IFlowItemToken& token,
+                                    ZMT::IFlowBufferConst* i_pBytes,
                                     ZMT::IFlowItemHandle& o_rItem) {
   if (!i_pBytes) return IResult::InvalidPointer;
   if (token.IsUnknownType()) return m_pUnknownTypes->GetOrCreateItem(token, i_pBytes, o_rItem);
@@ -120,8 +122,8 @@ IResult VFlowStore::GetOrCreateItem(const ZMT::IFlowItemToken& token, ZMT::IFlow
   return pStore->GetOrCreateItem(token, i_pBytes, {}, o_rItem);
 }
 
-IResult VFlowStore::GetReader(const ZMT::IFlowItemTypeInfo& fileType, const ZMT::ISchema& fileSchema,
-                              ZMT::IFlowItemFromBytes& o_rReader) {
+IResult VFlowStore::GetReader(const ZMT::IFlowItemTypeInfo& fileType,
+                              const ZMT::ISchema& fileSchema, ZMT::IFlowItemFromBytes& o_rReader) {
   VFlowStoreTypeSpecific* pStore = ById(fileType.m_TypeId);
   if (!pStore) {
     std::uint32_t localId = 0;
@@ -145,7 +147,8 @@ IResult VFlowStore::GetReader(const ZMT::IFlowItemTypeInfo& fileType, const ZMT:
   } else {
     const ZMT::IFlowItemVersion& file = fileType.m_Version;
     if (file.m_Major != local.m_Version.m_Major) return IResult::InvalidType;
-    if (file > local.m_Version && file.m_Minor != local.m_Version.m_Minor) return IResult::InvalidType;
+    if (file > local.m_Version && file.m_Minor != local.m_Version.m_Minor)
+      return IResult::InvalidType;
     read = pStore->GetFactory().GetReader(&fileSchema);
     if (!read) return IResult::InvalidType;
   }
@@ -209,7 +212,8 @@ IResult VFlowStore::GetAllCounts(std::vector<ZMT::IFlowItemCounts>& o_rCounts) c
     store.GetCounts(counts.m_Live, counts.m_Peak, counts.m_Created);
     o_rCounts.push_back(std::move(counts));
   };
-  for (const auto& [typeId, pStore] : m_TypesById) add(*pStore, typeId);
+  for (const auto& [typeId, pStore] : m_TypesById)
+    add(*pStore, typeId);
   add(*m_pUnknownTypes, 0xFFFFFFFFu);
   return IResult::Ok;
 }

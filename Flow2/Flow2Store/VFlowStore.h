@@ -25,7 +25,8 @@ public:
   ZMT::IResult GetTypeInfo(std::uint32_t typeId, ZMT::IFlowItemTypeInfo& o_rInfo) const override;
   ZMT::IResult GetTypeInfo(const std::string& name, ZMT::IFlowItemTypeInfo& o_rInfo) const override;
   ZMT::IResult GetTypeInfos(std::vector<ZMT::IFlowItemTypeInfo>& o_rInfos) const override;
-  ZMT::IResult CreateItem(const ZMT::IFlowItemTypeInfo& type, ZMT::IFlowItemHandle& o_rItem) override;
+  ZMT::IResult CreateItem(const ZMT::IFlowItemTypeInfo& type,
+                          ZMT::IFlowItemHandle& o_rItem) override;
   ZMT::IResult CreateItems(const ZMT::IFlowItemTypeInfo& type, std::uint32_t count,
                            std::vector<ZMT::IFlowItemHandle>& io_rItems) override;
   ZMT::IResult FindItem(const ZMT::IFlowItemToken& token, ZMT::IFlowItemHandle& o_rItem) override;
@@ -53,7 +54,8 @@ private:
   explicit VFlowStore(std::uint64_t flowStoreId) : m_FlowStoreId(flowStoreId) {}
   /// The type store of a registered type, or the error for it: InvalidId if unknown,
   /// InvalidVersion if the versions differ.
-  ZMT::IResult Resolve(const ZMT::IFlowItemTypeInfo& type, VFlowStoreTypeSpecific*& o_rpStore) const;
+  ZMT::IResult Resolve(const ZMT::IFlowItemTypeInfo& type,
+                       VFlowStoreTypeSpecific*& o_rpStore) const;
   VFlowStoreTypeSpecific* ById(std::uint32_t typeId) const;
   /// The store an entry of this token lives in: a type store, the unknown store, or null.
   VItemStoreBase* StoreOf(const ZMT::IFlowItemToken& token) const;

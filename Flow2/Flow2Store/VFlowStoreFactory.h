@@ -10,7 +10,8 @@ class VFlowStoreFactory final : public ZMT::IFlowStoreFactory {
 public:
   /// A flowStoreId of 0 draws a random one. AlreadyPresent if two factories register the same type
   /// id or name; FailedWithException if the random source fails.
-  ZMT::IResult CreateStore(ZMT::IFlowStoreHandle& o_rStore, const ZMT::IFlowItemFactories& factories,
+  ZMT::IResult CreateStore(ZMT::IFlowStoreHandle& o_rStore,
+                           const ZMT::IFlowItemFactories& factories,
                            std::uint64_t flowStoreId) override;
   ZMT::IResult CreateStateFactory(ZMT::IFlowStateFactoryHandle& o_rFactory) override;
   ZMT::IResult CreateBufferFactory(ZMT::IFlowBufferFactoryHandle& o_rFactory,

@@ -26,7 +26,8 @@ public:
   /// The item of the token: the one held, or a new one read from the bytes with `read` (the
   /// native reader when empty). Takes the bytes over.
   ZMT::IResult GetOrCreateItem(const ZMT::IFlowItemToken& token, ZMT::IFlowBufferConst* i_pBytes,
-                               const ZMT::IFlowItemReadFunction& read, ZMT::IFlowItemHandle& o_rItem);
+                               const ZMT::IFlowItemReadFunction& read,
+                               ZMT::IFlowItemHandle& o_rItem);
 
 private:
   /// An entry with a default item, out of every list; null if the factory gave no item.

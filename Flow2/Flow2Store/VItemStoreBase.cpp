@@ -6,7 +6,9 @@ namespace Flow2Store {
 
 using ZMT::IResult;
 
-void VFlowStoreEntry::Release() { m_pStore->ReleaseEntry(this); }
+void VFlowStoreEntry::Release() {
+  m_pStore->ReleaseEntry(this);
+}
 
 VItemStoreBase::VItemStoreBase(std::shared_ptr<ZMT::IFlowItemFactory> i_pFactory,
                                ZMT::IFlowStore* i_pOwner, std::string name)
@@ -15,7 +17,8 @@ VItemStoreBase::VItemStoreBase(std::shared_ptr<ZMT::IFlowItemFactory> i_pFactory
 
 VItemStoreBase::~VItemStoreBase() {
   // Live entries hold the store, so only the free list is left.
-  while (VFlowStoreEntry* pEntry = FreePopFront()) delete pEntry;
+  while (VFlowStoreEntry* pEntry = FreePopFront())
+    delete pEntry;
 }
 
 VFlowStoreEntry* VItemStoreBase::Lookup(const ZMT::IFlowItemToken& token) const {
@@ -36,7 +39,8 @@ void VItemStoreBase::Link(VFlowStoreEntry* i_pEntry) {
 void VItemStoreBase::Unlink(VFlowStoreEntry* i_pEntry) {
   if (!i_pEntry->m_Linked) return;
   VFlowStoreEntry** ppLink = &m_pBuckets[ZMT::hash_value(i_pEntry->m_Token) % BucketCount];
-  while (*ppLink && *ppLink != i_pEntry) ppLink = &(*ppLink)->m_pHashNext;
+  while (*ppLink && *ppLink != i_pEntry)
+    ppLink = &(*ppLink)->m_pHashNext;
   if (*ppLink) *ppLink = i_pEntry->m_pHashNext;
   i_pEntry->m_pHashNext = nullptr;
   i_pEntry->m_Linked = false;
@@ -117,7 +121,8 @@ void VItemStoreBase::ReleaseEntry(VFlowStoreEntry* i_pEntry) {
     }
     FreePushBack(i_pEntry);
     if (m_FreeCount > FreeLimit && m_FreeCount > FreeLiveRatio * m_LiveCount)
-      for (int i = 0; i < 2; ++i) delete FreePopFront();
+      for (int i = 0; i < 2; ++i)
+        delete FreePopFront();
     dropStore = --m_LiveCount == 0;
   }
   if (dropStore) m_pOwner->DropReference();

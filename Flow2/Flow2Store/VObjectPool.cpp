@@ -14,7 +14,8 @@ struct VThreadObjects {
   std::vector<void*> m_Objects;
 
   ~VThreadObjects() {
-    for (void* pObject : m_Objects) m_pDelete(pObject);
+    for (void* pObject : m_Objects)
+      m_pDelete(pObject);
   }
 };
 
@@ -60,6 +61,8 @@ void DropThreadObjects(std::uint64_t poolId) {
   caches.m_Pools.erase(it);
 }
 
-std::uint64_t NewPoolId() { return s_NextPoolId.fetch_add(1, std::memory_order_relaxed); }
+std::uint64_t NewPoolId() {
+  return s_NextPoolId.fetch_add(1, std::memory_order_relaxed);
+}
 
 } // namespace Flow2Store::Detail

@@ -36,7 +36,8 @@ public:
   /// they end.
   ~VObjectPool() {
     DropThreadObjects(m_Id);
-    for (T* pObject : m_Global) delete pObject;
+    for (T* pObject : m_Global)
+      delete pObject;
   }
 
   /// Raises std::bad_alloc when new objects are needed and can't be made.
@@ -61,7 +62,8 @@ public:
 
 private:
   std::vector<void*>& Local() {
-    return ThreadObjects(m_Id, [](void* p) { delete static_cast<T*>(p); }, ThreadCapacity);
+    return ThreadObjects(
+        m_Id, [](void* p) { delete static_cast<T*>(p); }, ThreadCapacity);
   }
 
   void Refill(std::vector<void*>& local) {
@@ -73,7 +75,8 @@ private:
         return;
       }
     }
-    for (std::size_t i = 0; i < Batch; ++i) local.push_back(m_Make());
+    for (std::size_t i = 0; i < Batch; ++i)
+      local.push_back(m_Make());
   }
 
   const std::uint64_t m_Id;

@@ -44,18 +44,28 @@ namespace Detail {
 constexpr std::uint32_t ReadGrowStep = 65536;
 
 template <class T> constexpr ISchema::EType ScalarType() {
-  if constexpr (std::is_same_v<T, bool>) return ISchema::Bool;
-  else if constexpr (std::is_floating_point_v<T>) return sizeof(T) == 4 ? ISchema::Float32 : ISchema::Float64;
+  if constexpr (std::is_same_v<T, bool>)
+    return ISchema::Bool;
+  else if constexpr (std::is_floating_point_v<T>)
+    return sizeof(T) == 4 ? ISchema::Float32 : ISchema::Float64;
   else if constexpr (std::is_signed_v<T>) {
-    if constexpr (sizeof(T) == 1) return ISchema::Int8;
-    else if constexpr (sizeof(T) == 2) return ISchema::Int16;
-    else if constexpr (sizeof(T) == 4) return ISchema::Int32;
-    else return ISchema::Int64;
+    if constexpr (sizeof(T) == 1)
+      return ISchema::Int8;
+    else if constexpr (sizeof(T) == 2)
+      return ISchema::Int16;
+    else if constexpr (sizeof(T) == 4)
+      return ISchema::Int32;
+    else
+      return ISchema::Int64;
   } else {
-    if constexpr (sizeof(T) == 1) return ISchema::UInt8;
-    else if constexpr (sizeof(T) == 2) return ISchema::UInt16;
-    else if constexpr (sizeof(T) == 4) return ISchema::UInt32;
-    else return ISchema::UInt64;
+    if constexpr (sizeof(T) == 1)
+      return ISchema::UInt8;
+    else if constexpr (sizeof(T) == 2)
+      return ISchema::UInt16;
+    else if constexpr (sizeof(T) == 4)
+      return ISchema::UInt32;
+    else
+      return ISchema::UInt64;
   }
 }
 
@@ -93,7 +103,9 @@ template <class E> struct TFlowField<E, std::enable_if_t<std::is_enum_v<E>>> {
   using U = std::underlying_type_t<E>;
   static_assert(sizeof(U) == 1 || sizeof(U) == 2 || sizeof(U) == 4, "enums are 8, 16 or 32 bit");
   static void Schema(ISchema& o_rSchema, bool) {
-    o_rSchema.m_Type = sizeof(U) == 1 ? ISchema::Enum8 : sizeof(U) == 2 ? ISchema::Enum16 : ISchema::Enum32;
+    o_rSchema.m_Type = sizeof(U) == 1   ? ISchema::Enum8
+                       : sizeof(U) == 2 ? ISchema::Enum16
+                                        : ISchema::Enum32;
     o_rSchema.m_Name = TFlowEnumDescription<E>::Name;
     o_rSchema.m_HasName = o_rSchema.m_Name.empty() ? 0 : 1;
     o_rSchema.m_EnumValues = TFlowEnumDescription<E>::Values();
@@ -142,7 +154,8 @@ template <class T, std::size_t N> struct TFlowField<std::array<T, N>> {
   }
   static std::uint64_t Size(const std::array<T, N>& v) {
     std::uint64_t size = 0;
-    for (const T& e : v) size += TFlowField<T>::Size(e);
+    for (const T& e : v)
+      size += TFlowField<T>::Size(e);
     return size;
   }
 };
@@ -170,7 +183,8 @@ template <class T> struct TFlowField<std::vector<T>> {
   }
   static std::uint64_t Size(const std::vector<T>& v) {
     std::uint64_t size = 4;
-    for (const T& e : v) size += TFlowField<T>::Size(e);
+    for (const T& e : v)
+      size += TFlowField<T>::Size(e);
     return size;
   }
 };
@@ -183,7 +197,8 @@ template <class A, class B> struct TFlowField<std::pair<A, B>> {
     TFlowField<B>::Schema(o_rSchema.m_Members[1].m_Schema, docs);
   }
   static bool Write(IOutputStream& s, const std::pair<A, B>& v) {
-    return TFlowField<std::remove_const_t<A>>::Write(s, v.first) && TFlowField<B>::Write(s, v.second);
+    return TFlowField<std::remove_const_t<A>>::Write(s, v.first) &&
+           TFlowField<B>::Write(s, v.second);
   }
   static bool Read(IInputStream& s, std::pair<A, B>& v) {
     return TFlowField<A>::Read(s, v.first) && TFlowField<B>::Read(s, v.second);
@@ -219,7 +234,8 @@ template <class K, class V> struct TFlowField<std::map<K, V>> {
   }
   static std::uint64_t Size(const std::map<K, V>& v) {
     std::uint64_t size = 4;
-    for (const auto& [key, value] : v) size += TFlowField<K>::Size(key) + TFlowField<V>::Size(value);
+    for (const auto& [key, value] : v)
+      size += TFlowField<K>::Size(key) + TFlowField<V>::Size(value);
     return size;
   }
 };
@@ -250,7 +266,8 @@ template <class K> struct TFlowField<std::set<K>> {
   }
   static std::uint64_t Size(const std::set<K>& v) {
     std::uint64_t size = 4;
-    for (const K& key : v) size += TFlowField<K>::Size(key);
+    for (const K& key : v)
+      size += TFlowField<K>::Size(key);
     return size;
   }
 };

@@ -20,8 +20,7 @@ namespace Detail {
 inline bool DropExtraOwner(std::atomic<std::uint32_t>& io_rCount) {
   std::uint32_t count = io_rCount.load(std::memory_order_acquire);
   while (count != 0)
-    if (io_rCount.compare_exchange_weak(count, count - 1, std::memory_order_acq_rel))
-      return false;
+    if (io_rCount.compare_exchange_weak(count, count - 1, std::memory_order_acq_rel)) return false;
   return true;
 }
 } // namespace Detail
@@ -51,7 +50,8 @@ public:
   IFlowItemHandle(const IFlowItemHandle& other) : m_pEntry(other.m_pEntry) {
     if (m_pEntry) m_pEntry->m_RefCount.fetch_add(1, std::memory_order_relaxed);
   }
-  IFlowItemHandle(IFlowItemHandle&& other) noexcept : m_pEntry(std::exchange(other.m_pEntry, nullptr)) {}
+  IFlowItemHandle(IFlowItemHandle&& other) noexcept
+      : m_pEntry(std::exchange(other.m_pEntry, nullptr)) {}
   IFlowItemHandle& operator=(IFlowItemHandle other) noexcept {
     std::swap(m_pEntry, other.m_pEntry);
     return *this;
@@ -68,6 +68,7 @@ public:
   IFlowStoreEntry* GetEntry() const { return m_pEntry; }
   IFlowItem* Get() const { return m_pEntry ? m_pEntry->m_pItem : nullptr; }
   IFlowItem* operator->() const { return Get(); }
+  IFlowItem& operator*() const { return *Get(); }
   /// The token of the item; the default token for an empty handle.
   IFlowItemToken GetToken() const { return m_pEntry ? m_pEntry->m_Token : IFlowItemToken(); }
   /// The item as its typed form, null if empty or of another type.

@@ -4,11 +4,11 @@ namespace ZMT {
 
 namespace {
 constexpr std::string_view Names[ISchema::TypeCount] = {
-    "Void",  "Bool",    "Int8",    "Int16", "Int32", "Int64",      "UInt8",
-    "UInt16", "UInt32", "UInt64",  "Float32", "Float64", "String", "Array",
-    "List",  "Tuple",   "NamedTuple", "Enum8", "Enum16", "Enum32", "Ref"};
+    "Void",   "Bool",   "Int8",       "Int16",   "Int32",   "Int64",  "UInt8",
+    "UInt16", "UInt32", "UInt64",     "Float32", "Float64", "String", "Array",
+    "List",   "Tuple",  "NamedTuple", "Enum8",   "Enum16",  "Enum32", "Ref"};
 constexpr std::uint32_t Sizes[ISchema::TypeCount] = {0, 1, 1, 2, 4, 8, 1, 2, 4, 8, 4,
-                                                      8, 0, 0, 0, 0, 0, 1, 2, 4, 0};
+                                                     8, 0, 0, 0, 0, 0, 1, 2, 4, 0};
 } // namespace
 
 std::string_view ISchema::TypeName(std::uint32_t type) {
@@ -24,7 +24,9 @@ bool ISchema::TypeFromName(std::string_view name, EType& o_rType) {
   return false;
 }
 
-std::uint32_t ISchema::ScalarSize(std::uint32_t type) { return type < TypeCount ? Sizes[type] : 0; }
+std::uint32_t ISchema::ScalarSize(std::uint32_t type) {
+  return type < TypeCount ? Sizes[type] : 0;
+}
 
 bool ISchema::operator==(const ISchema& other) const {
   if (m_Type != other.m_Type || m_HasName != other.m_HasName || m_Count != other.m_Count)

@@ -53,8 +53,9 @@ private:
     const T probe{};
     T::FlowFields(probe, [&](const char* name, const char* text, const auto& field) {
       using F = std::decay_t<decltype(field)>;
-      description.m_Members.push_back(
-          {name, text, [](ISchema& o_rSchema, bool docs) { TFlowField<F, void>::Schema(o_rSchema, docs); }});
+      description.m_Members.push_back({name, text, [](ISchema& o_rSchema, bool docs) {
+                                         TFlowField<F, void>::Schema(o_rSchema, docs);
+                                       }});
     });
     return description;
   }

@@ -26,7 +26,8 @@ template <class T> const IFlowItemStaticInfo& FlowTypeStatics() {
     info.m_TypeInfo.m_Name = T::FlowTypeName;
     info.m_TypeInfo.m_TypeId = T::FlowTypeId;
     info.m_TypeInfo.m_Version = T::FlowVersion;
-    if constexpr (requires { T::FlowDescription; }) info.m_TypeInfo.m_Description = T::FlowDescription;
+    if constexpr (requires { T::FlowDescription; })
+      info.m_TypeInfo.m_Description = T::FlowDescription;
     TFlowField<T>::Schema(info.m_Schema, true);
     return info;
   }();
@@ -49,7 +50,9 @@ public:
   bool Write(IOutputStream& io_rStream) const override {
     return TFlowField<T>::Write(io_rStream, static_cast<const T&>(*this));
   }
-  std::uint64_t GetSize() const override { return TFlowField<T>::Size(static_cast<const T&>(*this)); }
+  std::uint64_t GetSize() const override {
+    return TFlowField<T>::Size(static_cast<const T&>(*this));
+  }
 
   static void* operator new(std::size_t size) {
     if (size != sizeof(VFlowItem)) return ::operator new(size);

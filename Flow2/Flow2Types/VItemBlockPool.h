@@ -44,7 +44,8 @@ public:
 private:
   VItemBlockPool() { m_Blocks.reserve(Capacity); }
   ~VItemBlockPool() {
-    for (void* pBlock : m_Blocks) ::operator delete(pBlock, std::align_val_t(Align));
+    for (void* pBlock : m_Blocks)
+      ::operator delete(pBlock, std::align_val_t(Align));
   }
   static VItemBlockPool& Instance() {
     static VItemBlockPool s_Pool;
