@@ -1,9 +1,11 @@
 #include "Flow2/Flow2Store/VFlowState.h"
 
 #include "Flow2/Flow2Store/VFlowStateFactory.h"
+#include "Flow2/Flow2Store/VItemStoreBase.h"
 
 #include <algorithm>
 #include <tuple>
+#include <typeinfo>
 
 namespace Flow2Store {
 
@@ -181,6 +183,7 @@ std::size_t VFlowState::CountItems(std::uint32_t typeId, EMatch match,
 
 void VFlowState::Clear() {
   if (m_Records.empty()) return;
+  ReleaseHandles();
   m_Records.clear();
   m_BeforeCount = m_AfterCount = 0;
   ++m_Revision;
@@ -283,14 +286,45 @@ void VFlowState::GetTokens(ZMT::VTokens& o_rTokens) const {
 }
 
 VRecordPosition VFlowState::Insert(const IFlowItemHandle& item, const VFlowTimestamp& time) {
-  VFlowStateRecord probe{item.GetToken(), time, {}};
-  auto it = std::lower_bound(m_Records.begin(), m_Records.end(), probe, RecordLess);
-  if (it != m_Records.end() && Key(*it) == Key(probe)) return it - m_Records.begin();
-  probe.m_Item = item;
+  IFlowItemHandle copy = item;
+  return Insert(std::move(copy), time);
+}
+
+VRecordPosition VFlowState::Insert(IFlowItemHandle&& io_rItem, const VFlowTimestamp& time) {
+  VFlowStateRecord probe{io_rItem.GetToken(), time, {}};
+  // Frames mostly arrive in order: appending needs no search.
+  auto it = m_Records.end();
+  if (!m_Records.empty() && !RecordLess(m_Records.back(), probe)) {
+    it = std::lower_bound(m_Records.begin(), m_Records.end(), probe, RecordLess);
+    if (it != m_Records.end() && Key(*it) == Key(probe)) return it - m_Records.begin();
+  }
+  probe.m_Item = std::move(io_rItem);
   it = m_Records.insert(it, std::move(probe));
   Count(*it, 1);
   ++m_Revision;
   return it - m_Records.begin();
+}
+
+void VFlowState::ReleaseHandles() {
+  constexpr std::size_t BatchSize = 64;
+  VFlowStoreEntry* batch[BatchSize];
+  std::size_t count = 0;
+  auto flush = [&] {
+    if (count) batch[0]->m_pStore->ReleaseEntries(batch, count);
+    count = 0;
+  };
+  for (VFlowStateRecord& record : m_Records) {
+    ZMT::IFlowStoreEntry* pEntry = record.m_Item.Detach();
+    if (!pEntry || !ZMT::Detail::DropExtraOwner(pEntry->m_RefCount)) continue;
+    if (typeid(*pEntry) != typeid(VFlowStoreEntry)) {
+      pEntry->Release();
+      continue;
+    }
+    auto* pStoreEntry = static_cast<VFlowStoreEntry*>(pEntry);
+    if (count == BatchSize || (count && batch[0]->m_pStore != pStoreEntry->m_pStore)) flush();
+    batch[count++] = pStoreEntry;
+  }
+  flush();
 }
 
 bool VFlowState::AddItems(const ZMT::VItemHandles& items, const VFlowTimestamp& time) {
@@ -303,6 +337,13 @@ bool VFlowState::AddItems(const ZMT::VItemHandles& items, const VFlowTimestamp& 
 void VFlowState::AddItems(const ZMT::VItemHandles& items) {
   for (const IFlowItemHandle& item : items)
     if (item) Insert(item, m_Time);
+}
+
+void VFlowState::AddItems(ZMT::VItemHandles&& io_rItems) {
+  m_Records.reserve(m_Records.size() + io_rItems.size());
+  for (IFlowItemHandle& item : io_rItems)
+    if (item) Insert(std::move(item), m_Time);
+  io_rItems.clear();
 }
 
 bool VFlowState::AddItem(const IFlowItemHandle& item, const VFlowTimestamp& time,

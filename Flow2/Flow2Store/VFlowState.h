@@ -94,6 +94,7 @@ public:
 
   bool AddItems(const ZMT::VItemHandles& items, const ZMT::VFlowTimestamp& time) override;
   void AddItems(const ZMT::VItemHandles& items) override;
+  void AddItems(ZMT::VItemHandles&& io_rItems) override;
   bool AddItem(const ZMT::IFlowItemHandle& item, const ZMT::VFlowTimestamp& time,
                ZMT::VRecordPosition& o_rPosition) override;
   void AddItem(const ZMT::IFlowItemHandle& item, ZMT::VRecordPosition& o_rPosition) override;
@@ -132,6 +133,9 @@ public:
 private:
   /// Inserts in order; an identical key keeps the record present. Returns its position.
   ZMT::VRecordPosition Insert(const ZMT::IFlowItemHandle& item, const ZMT::VFlowTimestamp& time);
+  ZMT::VRecordPosition Insert(ZMT::IFlowItemHandle&& io_rItem, const ZMT::VFlowTimestamp& time);
+  /// Drops the handles of all records, releasing entries of one type store under one lock.
+  void ReleaseHandles();
   /// Removes the records the predicate picks; returns how many.
   template <class P> std::size_t EraseIf(P pick);
   /// Adds the other state's records the predicate picks, keeping records present.

@@ -110,20 +110,23 @@ IResult VItemStoreBase::FindItem(const ZMT::IFlowItemToken& token, ZMT::IFlowIte
   return IResult::Ok;
 }
 
-void VItemStoreBase::ReleaseEntry(VFlowStoreEntry* i_pEntry) {
+void VItemStoreBase::ReleaseEntries(VFlowStoreEntry* const* i_ppEntries, std::size_t count) {
   bool dropStore = false;
   {
     std::lock_guard<std::mutex> lock(m_Mutex);
-    // An owner added by a racing lookup takes the release over.
-    if (i_pEntry->m_RefCount.load(std::memory_order_relaxed) != 0) {
-      i_pEntry->m_RefCount.fetch_sub(1, std::memory_order_relaxed);
-      return;
+    for (std::size_t i = 0; i < count; ++i) {
+      VFlowStoreEntry* pEntry = i_ppEntries[i];
+      // An owner added by a racing lookup takes the release over.
+      if (pEntry->m_RefCount.load(std::memory_order_relaxed) != 0) {
+        pEntry->m_RefCount.fetch_sub(1, std::memory_order_relaxed);
+        continue;
+      }
+      FreePushBack(pEntry);
+      if (m_FreeCount > FreeLimit && m_FreeCount > FreeLiveRatio * m_LiveCount)
+        for (int j = 0; j < 2; ++j)
+          delete FreePopFront();
+      dropStore = --m_LiveCount == 0;
     }
-    FreePushBack(i_pEntry);
-    if (m_FreeCount > FreeLimit && m_FreeCount > FreeLiveRatio * m_LiveCount)
-      for (int i = 0; i < 2; ++i)
-        delete FreePopFront();
-    dropStore = --m_LiveCount == 0;
   }
   if (dropStore) m_pOwner->DropReference();
 }

@@ -31,7 +31,9 @@ public:
   /// The live or cached item of a token; InvalidToken if there is none.
   ZMT::IResult FindItem(const ZMT::IFlowItemToken& token, ZMT::IFlowItemHandle& o_rItem);
   /// Called by an entry's last owner.
-  void ReleaseEntry(VFlowStoreEntry* i_pEntry);
+  void ReleaseEntry(VFlowStoreEntry* i_pEntry) { ReleaseEntries(&i_pEntry, 1); }
+  /// Called by the last owners of several entries of this store: one lock for all.
+  void ReleaseEntries(VFlowStoreEntry* const* i_ppEntries, std::size_t count);
   /// The entry's bytes, written once; InvalidHandle if the entry isn't live in this store.
   ZMT::IResult GetItemBuffer(VFlowStoreEntry* i_pEntry, ZMT::IFlowItemWriter& writer,
                              const ZMT::IFlowBufferConst*& o_rpBytes);

@@ -63,6 +63,9 @@ public:
       if (Detail::DropExtraOwner(pEntry->m_RefCount)) pEntry->Release();
   }
 
+  /// Gives up the handle's ownership to the caller without dropping it.
+  IFlowStoreEntry* Detach() { return std::exchange(m_pEntry, nullptr); }
+
   explicit operator bool() const { return m_pEntry != nullptr; }
   bool operator==(const IFlowItemHandle& other) const { return m_pEntry == other.m_pEntry; }
   IFlowStoreEntry* GetEntry() const { return m_pEntry; }

@@ -104,6 +104,8 @@ public:
   /// The forms with a time add nothing and return false unless it overlaps the state's time.
   virtual bool AddItems(const VItemHandles& items, const VFlowTimestamp& time) = 0;
   virtual void AddItems(const VItemHandles& items) = 0;
+  /// Moves the handles in at the state's time; the vector is left empty, its capacity kept.
+  virtual void AddItems(VItemHandles&& io_rItems) = 0;
   virtual bool AddItem(const IFlowItemHandle& item, const VFlowTimestamp& time,
                        VRecordPosition& o_rPosition) = 0;
   virtual void AddItem(const IFlowItemHandle& item, VRecordPosition& o_rPosition) = 0;
