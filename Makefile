@@ -3,7 +3,7 @@ BUILD ?= build
 JOBS ?= $(shell nproc)
 CMAKE_FLAGS ?=
 
-.PHONY: all setup configure build run test bench fuzz tsan clean format
+.PHONY: all setup configure build run test bench fuzz tsan asan clean format
 
 all: build
 
@@ -49,8 +49,17 @@ tsan: setup
 	cd $(BUILD)-tsan && TSAN_OPTIONS="halt_on_error=1 second_deadlock_stack=1" \
 	  ctest -R 'Flow' --output-on-failure
 
+# The Flow tests under AddressSanitizer (leaks included) and UndefinedBehaviorSanitizer.
+asan: setup
+	cmake -S . -B $(BUILD)-asan -DCMAKE_BUILD_TYPE=Debug -DANVIL_BENCH=OFF \
+	  -DCMAKE_CXX_FLAGS="-fsanitize=address,undefined -fno-omit-frame-pointer" \
+	  -DCMAKE_EXE_LINKER_FLAGS="-fsanitize=address,undefined" $(CMAKE_FLAGS)
+	cmake --build $(BUILD)-asan -j $(JOBS) --target test_Flow2Types test_Flow2Store
+	cd $(BUILD)-asan && ASAN_OPTIONS="detect_leaks=1" UBSAN_OPTIONS="halt_on_error=1" \
+	  ctest -R 'Flow' --output-on-failure
+
 format:
 	git ls-files '*.cpp' '*.h' | xargs clang-format -i
 
 clean:
-	rm -rf $(BUILD) $(BUILD)-bench $(BUILD)-fuzz $(BUILD)-tsan out
+	rm -rf $(BUILD) $(BUILD)-bench $(BUILD)-fuzz $(BUILD)-tsan $(BUILD)-asan out

@@ -47,7 +47,7 @@ TEST_F(FlowThreads, HandlesCopiedAndMovedAcrossThreadsCountEveryOwner) {
 TEST_F(FlowThreads, FourWorkersStreamItemsAndStatesConcurrently) {
   ZMT::IFlowStateFactoryHandle states;
   ASSERT_TRUE(Flow2Store::GetFlowStoreFactory().CreateStateFactory(states).IsSuccess());
-  constexpr int Frames = 400;
+  constexpr int Frames = 1000;
   std::atomic<int> failures{0};
   std::atomic<std::uint64_t> found{0};
 
