@@ -3,7 +3,7 @@ BUILD ?= build
 JOBS ?= $(shell nproc)
 CMAKE_FLAGS ?=
 
-.PHONY: all setup configure build run test asan bench fuzz clean format
+.PHONY: all setup configure build run test bench fuzz tsan asan clean format
 
 all: build
 
@@ -51,8 +51,17 @@ fuzz: setup
 	cmake --build $(BUILD)-fuzz -j $(JOBS)
 	@echo "fuzz targets in $(BUILD)-fuzz/bin/fuzz_*"
 
+# The Flow tests under ThreadSanitizer, in a build directory of their own.
+tsan: setup
+	cmake -S . -B $(BUILD)-tsan -DCMAKE_BUILD_TYPE=RelWithDebInfo -DANVIL_BENCH=OFF \
+	  -DCMAKE_CXX_FLAGS="-fsanitize=thread -fno-omit-frame-pointer" \
+	  -DCMAKE_EXE_LINKER_FLAGS="-fsanitize=thread" $(CMAKE_FLAGS)
+	cmake --build $(BUILD)-tsan -j $(JOBS) --target test_Flow2Types test_Flow2Store
+	cd $(BUILD)-tsan && TSAN_OPTIONS="halt_on_error=1 second_deadlock_stack=1" \
+	  ctest -R 'Flow' --output-on-failure
+
 format:
 	git ls-files '*.cpp' '*.h' | xargs clang-format -i
 
 clean:
-	rm -rf $(BUILD) $(BUILD)-bench $(BUILD)-fuzz $(BUILD)-asan out
+	rm -rf $(BUILD) $(BUILD)-bench $(BUILD)-fuzz $(BUILD)-tsan $(BUILD)-asan out
