@@ -8,6 +8,12 @@ namespace {
 // A new key is cubic with automatic tangents until told otherwise.
 constexpr uint32_t kNewKeyFlags =
     uint32_t(FbxAnimCurveDef::eInterpolationCubic) | uint32_t(FbxAnimCurveDef::eTangentAuto);
+
+uint32_t withInterpolation(uint32_t i_flags, FbxAnimCurveDef::EInterpolationType i_type) {
+  const uint32_t flags = (i_flags & ~FbxAnimCurveDef::kInterpolationMask) | uint32_t(i_type);
+  // Tangent modes only mean something for cubic keys.
+  return i_type == FbxAnimCurveDef::eInterpolationCubic ? flags : flags & ~uint32_t(0x7F00);
+}
 } // namespace
 
 FbxAnimStack* FbxAnimStack::Create(FbxScene* i_pScene, const char* i_pName) {
@@ -53,9 +59,26 @@ int FbxAnimCurve::KeyAdd(FbxTime i_time) {
 
 void FbxAnimCurve::KeySetInterpolation(int i_index, FbxAnimCurveDef::EInterpolationType i_type) {
   uint32_t& flags = m_flags[size_t(i_index)];
-  flags = (flags & ~FbxAnimCurveDef::kInterpolationMask) | uint32_t(i_type);
-  // Tangent modes only mean something for cubic keys.
-  if (i_type != FbxAnimCurveDef::eInterpolationCubic) flags &= ~uint32_t(0x7F00);
+  flags = withInterpolation(flags, i_type);
+}
+
+void FbxAnimCurve::addKeys(std::span<const int64_t> i_times, std::span<const float> i_values,
+                           FbxAnimCurveDef::EInterpolationType i_type) {
+  const size_t n = std::min(i_times.size(), i_values.size());
+  bool increasing = m_times.empty() || n == 0 || i_times[0] > m_times.back();
+  for (size_t k = 1; increasing && k < n; ++k)
+    increasing = i_times[k] > i_times[k - 1];
+  if (!increasing) {
+    for (size_t k = 0; k < n; ++k) {
+      const int index = KeyAdd(FbxTime(i_times[k]));
+      KeySetValue(index, i_values[k]);
+      KeySetInterpolation(index, i_type);
+    }
+    return;
+  }
+  m_times.insert(m_times.end(), i_times.begin(), i_times.begin() + long(n));
+  m_values.insert(m_values.end(), i_values.begin(), i_values.begin() + long(n));
+  m_flags.resize(m_flags.size() + n, withInterpolation(kNewKeyFlags, i_type));
 }
 
 size_t FbxAnimCurve::keyBytes() const {

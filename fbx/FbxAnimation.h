@@ -4,6 +4,7 @@
 #include "fbx/FbxNode.h"
 #include "fbx/FbxTime.h"
 #include <cstdint>
+#include <span>
 #include <string>
 #include <vector>
 
@@ -76,6 +77,10 @@ public:
   void KeySetValue(int i_index, float i_value) { m_values[size_t(i_index)] = i_value; }
   /// Replaces the interpolation bits of a key's flags.
   void KeySetInterpolation(int i_index, FbxAnimCurveDef::EInterpolationType i_type);
+  /// Adds many keys at once, with the result of KeyAdd, KeySetValue and KeySetInterpolation
+  /// called key by key. Times after the last key, strictly increasing, are appended whole.
+  void addKeys(std::span<const int64_t> i_times, std::span<const float> i_values,
+               FbxAnimCurveDef::EInterpolationType i_type);
   int KeyGetCount() const { return int(m_times.size()); }
   FbxTime KeyGetTime(int i_index) const { return FbxTime(m_times[size_t(i_index)]); }
   float KeyGetValue(int i_index) const { return m_values[size_t(i_index)]; }

@@ -18,6 +18,13 @@ void VFbxByteSink::append(const void* i_pData, size_t i_size) {
   }
 }
 
+std::span<uint8_t> VFbxByteSink::tail() {
+  const size_t offset = size_t(m_size % kBlockSize);
+  if (offset == 0 && m_size / kBlockSize == m_blocks.size())
+    m_blocks.push_back(std::unique_ptr<uint8_t[]>(new uint8_t[kBlockSize])); // no zero fill
+  return {m_blocks[size_t(m_size / kBlockSize)].get() + offset, kBlockSize - offset};
+}
+
 void VFbxByteSink::patch(uint64_t i_offset, const void* i_pData, size_t i_size) {
   const auto* p = static_cast<const uint8_t*>(i_pData);
   while (i_size > 0) {

@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <cstdio>
 #include <memory>
+#include <span>
 #include <vector>
 
 namespace AnvilFbx {
@@ -15,6 +16,14 @@ public:
   void append(const void* i_pData, size_t i_size);
   /// Overwrites bytes already appended.
   void patch(uint64_t i_offset, const void* i_pData, size_t i_size);
+  /// Room to write in place at the end: the rest of the last block, or a new block.
+  std::span<uint8_t> tail();
+  /// Takes `i_size` bytes written into the room `tail` gave as appended.
+  void grow(size_t i_size) { m_size += i_size; }
+  /// Drops the bytes after the first `i_size`; their blocks stay for reuse.
+  void truncate(uint64_t i_size) {
+    if (i_size < m_size) m_size = i_size;
+  }
   uint64_t size() const { return m_size; }
   /// Writes everything to the stream; false on a short write.
   bool writeTo(std::FILE* i_pStream) const;

@@ -1,7 +1,6 @@
 #include "FbxRecordWriter.h"
 #include <cstring>
 #include <stdexcept>
-#include <zlib.h>
 
 namespace AnvilFbx {
 
@@ -107,19 +106,17 @@ void VFbxRecordWriter::array(char i_type, const void* i_pData, uint32_t i_count,
   property(i_type);
   const size_t bytes = size_t(i_count) * i_elementSize;
   if (bytes > m_threshold) {
-    uLongf compressedSize = compressBound(uLong(bytes));
-    if (m_scratch.size() < compressedSize) m_scratch.resize(compressedSize);
-    // Level 1: key data are large and the time saved outweighs the few bytes more.
-    if (compress2(m_scratch.data(), &compressedSize, static_cast<const Bytef*>(i_pData),
-                  uLong(bytes), 1) == Z_OK &&
-        compressedSize < bytes) {
-      putValue<uint32_t>(i_count);
-      putValue<uint32_t>(1);
-      putValue<uint32_t>(uint32_t(compressedSize));
-      put(m_scratch.data(), compressedSize);
+    // The header's stored length is patched once the compressed length is known.
+    const uint64_t header = m_rSink.size();
+    const uint32_t fields[3] = {i_count, 1, 0};
+    put(fields, sizeof fields);
+    if (const size_t compressedSize = m_deflater.compress(i_pData, bytes, m_rSink)) {
+      const uint32_t stored = uint32_t(compressedSize);
+      m_rSink.patch(header + 8, &stored, sizeof stored);
       ++m_compressed;
       return;
     }
+    m_rSink.truncate(header);
   }
   putValue<uint32_t>(i_count);
   putValue<uint32_t>(0);

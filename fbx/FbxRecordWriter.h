@@ -3,6 +3,7 @@
 // lists, arrays compressed with zlib above a threshold, and the footer. Record headers are
 // 32-bit below version 7500 and 64-bit from it on.
 #include "fbx/FbxByteSink.h"
+#include "fbx/FbxDeflater.h"
 #include <cstdint>
 #include <span>
 #include <string_view>
@@ -64,7 +65,7 @@ private:
   bool m_wide;
   size_t m_threshold;
   std::vector<Open> m_open;
-  std::vector<uint8_t> m_scratch;
+  VFbxDeflater m_deflater;
   int m_compressed = 0;
 };
 

@@ -390,26 +390,30 @@ void AnvilFbxExporter::writeCurves(const Pass& i_rPass, FbxNode* i_pFbx, Node* i
       if (keepKey(i_rTimes[k])) kept.push_back(int(k));
     return kept;
   };
-  // Three curves of a property, one key per kept index, values from `i_value`.
+  // Three curves of a property, one key per kept index, values from `i_value`. The keys are
+  // gathered column by column and handed to each curve in one call.
   auto writeVector = [&](FbxAnimatableDouble3& io_rProperty, const std::vector<HTime>& i_rTimes,
                          const std::vector<int>& i_rKept, auto i_value, FbxAnimCurve** o_ppCurves) {
+    const size_t count = i_rKept.size();
+    m_keyTimes.resize(count);
+    for (auto& column : m_keyValues)
+      column.resize(count);
+    for (size_t i = 0; i < count; ++i) {
+      const size_t k = size_t(i_rKept[i]);
+      const Vec3 v = i_value(int(k));
+      m_keyTimes[i] = fbxTime(i_rTimes[k]).Get();
+      m_keyValues[0][i] = float(v.x);
+      m_keyValues[1][i] = float(v.y);
+      m_keyValues[2][i] = float(v.z);
+    }
     for (int a = 0; a < 3; ++a) {
       o_ppCurves[a] = io_rProperty.GetCurve(pLayer, kAxes[a], true);
-      o_ppCurves[a]->ResizeKeyBuffer(int(i_rKept.size()));
+      o_ppCurves[a]->ResizeKeyBuffer(o_ppCurves[a]->KeyGetCount() + int(count));
       o_ppCurves[a]->KeyModifyBegin();
-    }
-    for (int k : i_rKept) {
-      const Vec3 v = i_value(k);
-      const FbxTime time = fbxTime(i_rTimes[size_t(k)]);
-      const double values[3] = {v.x, v.y, v.z};
-      for (int a = 0; a < 3; ++a) {
-        const int index = o_ppCurves[a]->KeyAdd(time);
-        o_ppCurves[a]->KeySetValue(index, float(values[a]));
-        o_ppCurves[a]->KeySetInterpolation(index, FbxAnimCurveDef::eInterpolationLinear);
-      }
-    }
-    for (int a = 0; a < 3; ++a)
+      o_ppCurves[a]->addKeys(m_keyTimes, m_keyValues[size_t(a)],
+                             FbxAnimCurveDef::eInterpolationLinear);
       o_ppCurves[a]->KeyModifyEnd();
+    }
   };
 
   FbxAnimCurve* curves[3];
