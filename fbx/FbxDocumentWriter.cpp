@@ -557,10 +557,10 @@ private:
     leafD("Default", {double(i_rCurve.values().front())});
     leafI("KeyVer", 4009);
     m_rWriter.begin("KeyTime");
-    m_rWriter.propArray(std::span<const int64_t>(i_rCurve.times()));
+    m_rWriter.propArrayView(std::span<const int64_t>(i_rCurve.times()));
     m_rWriter.end();
     m_rWriter.begin("KeyValueFloat");
-    m_rWriter.propArray(std::span<const float>(i_rCurve.values()));
+    m_rWriter.propArrayView(std::span<const float>(i_rCurve.values()));
     m_rWriter.end();
     // Attributes run-length encoded: one entry per run of keys with equal flags.
     std::vector<int32_t> flags, counts;
