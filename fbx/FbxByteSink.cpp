@@ -69,6 +69,8 @@ void VFbxByteSink::truncate(uint64_t i_size) {
 }
 
 void VFbxByteSink::patch(uint64_t i_offset, const void* i_pData, size_t i_size) {
+  if (i_offset > m_size || i_size > m_size - i_offset)
+    throw std::out_of_range("patch outside the written bytes");
   const auto* p = static_cast<const uint8_t*>(i_pData);
   auto it = std::upper_bound(
       m_segments.begin(), m_segments.end(), i_offset,

@@ -10,8 +10,10 @@ double nearestTurn(double i_angle, double i_reference) {
 }
 
 bool sameKeyTimes(FbxAnimCurve* const* i_ppCurves) {
-  return i_ppCurves[0]->times() == i_ppCurves[1]->times() &&
-         i_ppCurves[0]->times() == i_ppCurves[2]->times();
+  auto same = [](const FbxAnimCurve* i_pA, const FbxAnimCurve* i_pB) {
+    return &i_pA->times() == &i_pB->times() || i_pA->times() == i_pB->times(); // shared or equal
+  };
+  return same(i_ppCurves[0], i_ppCurves[1]) && same(i_ppCurves[0], i_ppCurves[2]);
 }
 } // namespace
 

@@ -2,7 +2,6 @@
 #include "plugin/host/AnvilRotation.h"
 #include "plugin/host/FileExporter.h"
 #include "plugin/host/Vec3.h"
-#include <array>
 #include <cstdint>
 #include <map>
 #include <set>
@@ -142,9 +141,6 @@ private:
   // For one write: the host node behind each FBX node (null for actors and the root), the
   // modules hidden from the export, the sample step and the take's range.
   std::map<const AnvilFbx::FbxNode*, Node*> m_hostOf;
-  // Key columns of the property being written, kept between properties to save allocations.
-  std::vector<int64_t> m_keyTimes;
-  std::array<std::vector<float>, 3> m_keyValues;
   std::set<const Module*> m_hidden;
   int64_t m_sampleStep = 1;
   int64_t m_rangeStart = 0, m_rangeEnd = 0;

@@ -24,6 +24,7 @@
 #include "plugin/host/SolvingSetup.h"
 #include "plugin/host/VideoCamera.h"
 #include <filesystem>
+#include <memory>
 
 using namespace AnvilFbx;
 
@@ -391,26 +392,27 @@ void AnvilFbxExporter::writeCurves(const Pass& i_rPass, FbxNode* i_pFbx, Node* i
     return kept;
   };
   // Three curves of a property, one key per kept index, values from `i_value`. The keys are
-  // gathered column by column and handed to each curve in one call.
+  // gathered column by column into arrays that the curves take over, the three sharing their
+  // times.
   auto writeVector = [&](FbxAnimatableDouble3& io_rProperty, const std::vector<HTime>& i_rTimes,
                          const std::vector<int>& i_rKept, auto i_value, FbxAnimCurve** o_ppCurves) {
     const size_t count = i_rKept.size();
-    m_keyTimes.resize(count);
-    for (auto& column : m_keyValues)
-      column.resize(count);
+    auto pKeyTimes = std::make_shared<std::vector<int64_t>>(count);
+    std::vector<float> columns[3] = {std::vector<float>(count), std::vector<float>(count),
+                                     std::vector<float>(count)};
+    std::vector<int64_t>& keyTimes = *pKeyTimes;
     for (size_t i = 0; i < count; ++i) {
       const size_t k = size_t(i_rKept[i]);
       const Vec3 v = i_value(int(k));
-      m_keyTimes[i] = fbxTime(i_rTimes[k]).Get();
-      m_keyValues[0][i] = float(v.x);
-      m_keyValues[1][i] = float(v.y);
-      m_keyValues[2][i] = float(v.z);
+      keyTimes[i] = fbxTime(i_rTimes[k]).Get();
+      columns[0][i] = float(v.x);
+      columns[1][i] = float(v.y);
+      columns[2][i] = float(v.z);
     }
     for (int a = 0; a < 3; ++a) {
       o_ppCurves[a] = io_rProperty.GetCurve(pLayer, kAxes[a], true);
-      o_ppCurves[a]->ResizeKeyBuffer(o_ppCurves[a]->KeyGetCount() + int(count));
       o_ppCurves[a]->KeyModifyBegin();
-      o_ppCurves[a]->addKeys(m_keyTimes, m_keyValues[size_t(a)],
+      o_ppCurves[a]->addKeys(pKeyTimes, std::move(columns[a]),
                              FbxAnimCurveDef::eInterpolationLinear);
       o_ppCurves[a]->KeyModifyEnd();
     }
