@@ -38,8 +38,8 @@ void FbxAnimCurve::ResizeKeyBuffer(int i_count) {
   m_values.reserve(n);
 }
 
-std::vector<int64_t>& FbxAnimCurve::ownTimes() {
-  if (m_pTimes.use_count() > 1) m_pTimes = std::make_shared<std::vector<int64_t>>(*m_pTimes);
+FbxKeyTimes& FbxAnimCurve::ownTimes() {
+  if (m_pTimes.use_count() > 1) m_pTimes = std::make_shared<FbxKeyTimes>(*m_pTimes);
   return *m_pTimes;
 }
 
@@ -95,7 +95,7 @@ void FbxAnimCurve::insertFlags(size_t i_index, uint32_t i_flags) {
 
 int FbxAnimCurve::KeyAdd(FbxTime i_time) {
   const int64_t t = i_time.Get();
-  std::vector<int64_t>& times = ownTimes();
+  FbxKeyTimes& times = ownTimes();
   if (times.empty() || t > times.back()) {
     times.push_back(t);
     m_values.push_back(0.0f);
@@ -127,7 +127,7 @@ void FbxAnimCurve::KeySetInterpolation(int i_index, FbxAnimCurveDef::EInterpolat
 void FbxAnimCurve::addKeys(std::span<const int64_t> i_times, std::span<const float> i_values,
                            FbxAnimCurveDef::EInterpolationType i_type) {
   const size_t n = std::min(i_times.size(), i_values.size());
-  const std::vector<int64_t>& times = *m_pTimes;
+  const FbxKeyTimes& times = *m_pTimes;
   bool increasing = times.empty() || n == 0 || i_times[0] > times.back();
   for (size_t k = 1; increasing && k < n; ++k)
     increasing = i_times[k] > i_times[k - 1];
@@ -140,7 +140,7 @@ void FbxAnimCurve::addKeys(std::span<const int64_t> i_times, std::span<const flo
     return;
   }
   if (n == 0) return;
-  std::vector<int64_t>& own = ownTimes();
+  FbxKeyTimes& own = ownTimes();
   own.insert(own.end(), i_times.begin(), i_times.begin() + long(n));
   m_values.insert(m_values.end(), i_values.begin(), i_values.begin() + long(n));
   const uint32_t flags = withInterpolation(kNewKeyFlags, i_type);
@@ -150,10 +150,9 @@ void FbxAnimCurve::addKeys(std::span<const int64_t> i_times, std::span<const flo
     m_flagRuns.push_back({flags, uint32_t(n)});
 }
 
-void FbxAnimCurve::addKeys(std::shared_ptr<std::vector<int64_t>> i_pTimes,
-                           std::vector<float> i_values,
+void FbxAnimCurve::addKeys(std::shared_ptr<FbxKeyTimes> i_pTimes, FbxKeyValues i_values,
                            FbxAnimCurveDef::EInterpolationType i_type) {
-  const std::vector<int64_t>& times = *i_pTimes;
+  const FbxKeyTimes& times = *i_pTimes;
   bool increasing = times.size() == i_values.size() && m_pTimes->empty();
   for (size_t k = 1; increasing && k < times.size(); ++k)
     increasing = times[k] > times[k - 1];

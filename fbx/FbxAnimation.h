@@ -1,6 +1,7 @@
 #pragma once
 // Animation: stacks (takes), their layers, and the curves that animate node properties. A curve
 // keeps its key times, values and flags in three flat arrays, the form the file stores.
+#include "fbx/FbxKeyStore.h"
 #include "fbx/FbxNode.h"
 #include "fbx/FbxTime.h"
 #include <cstdint>
@@ -92,30 +93,30 @@ public:
   /// The same, taking the arrays over instead of copying them when the curve has no keys and
   /// the times strictly increase: the times may be shared by other curves (each copies them
   /// before it changes them).
-  void addKeys(std::shared_ptr<std::vector<int64_t>> i_pTimes, std::vector<float> i_values,
+  void addKeys(std::shared_ptr<FbxKeyTimes> i_pTimes, FbxKeyValues i_values,
                FbxAnimCurveDef::EInterpolationType i_type);
   int KeyGetCount() const { return int(m_pTimes->size()); }
   FbxTime KeyGetTime(int i_index) const { return FbxTime((*m_pTimes)[size_t(i_index)]); }
   float KeyGetValue(int i_index) const { return m_values[size_t(i_index)]; }
   uint32_t KeyGetFlags(int i_index) const;
 
-  const std::vector<int64_t>& times() const { return *m_pTimes; }
-  const std::vector<float>& values() const { return m_values; }
-  std::vector<float>& values() { return m_values; }
+  const FbxKeyTimes& times() const { return *m_pTimes; }
+  const FbxKeyValues& values() const { return m_values; }
+  FbxKeyValues& values() { return m_values; }
   /// Flags run-length encoded, neighbouring runs always different.
   const std::vector<FlagRun>& flagRuns() const { return m_flagRuns; }
 
 private:
   friend class FbxAnimatableDouble3;
   using FbxObject::FbxObject;
-  std::vector<int64_t>& ownTimes();
+  FbxKeyTimes& ownTimes();
   /// The run holding a key and the key's place in it.
   std::pair<size_t, uint32_t> runOf(size_t i_index) const;
   void insertFlags(size_t i_index, uint32_t i_flags);
   void mergeRuns(size_t i_first, size_t i_last);
 
-  std::shared_ptr<std::vector<int64_t>> m_pTimes = std::make_shared<std::vector<int64_t>>();
-  std::vector<float> m_values;
+  std::shared_ptr<FbxKeyTimes> m_pTimes = std::make_shared<FbxKeyTimes>();
+  FbxKeyValues m_values;
   std::vector<FlagRun> m_flagRuns;
 };
 

@@ -24,7 +24,7 @@ bool FbxAnimCurveFilterUnroll::Apply(FbxAnimCurve** i_ppCurves, int i_count) {
 
   if (!sameKeyTimes(i_ppCurves)) {
     for (int c = 0; c < 3; ++c) {
-      std::vector<float>& values = i_ppCurves[c]->values();
+      FbxKeyValues& values = i_ppCurves[c]->values();
       for (size_t k = 1; k < values.size(); ++k)
         values[k] = float(nearestTurn(values[k], values[k - 1]));
     }
@@ -34,8 +34,8 @@ bool FbxAnimCurveFilterUnroll::Apply(FbxAnimCurve** i_ppCurves, int i_count) {
   // Angles indexed by the order's application sequence: first, middle, last axis.
   static const int kAxes[6][3] = {{0, 1, 2}, {0, 2, 1}, {1, 2, 0}, {1, 0, 2}, {2, 0, 1}, {2, 1, 0}};
   const int* axes = kAxes[int(m_order)];
-  std::vector<float>* channels[3] = {&i_ppCurves[0]->values(), &i_ppCurves[1]->values(),
-                                     &i_ppCurves[2]->values()};
+  FbxKeyValues* channels[3] = {&i_ppCurves[0]->values(), &i_ppCurves[1]->values(),
+                               &i_ppCurves[2]->values()};
   const size_t count = channels[0]->size();
   double previous[3] = {};
   for (size_t k = 0; k < count; ++k) {

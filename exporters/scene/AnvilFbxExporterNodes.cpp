@@ -397,10 +397,9 @@ void AnvilFbxExporter::writeCurves(const Pass& i_rPass, FbxNode* i_pFbx, Node* i
   auto writeVector = [&](FbxAnimatableDouble3& io_rProperty, const std::vector<HTime>& i_rTimes,
                          const std::vector<int>& i_rKept, auto i_value, FbxAnimCurve** o_ppCurves) {
     const size_t count = i_rKept.size();
-    auto pKeyTimes = std::make_shared<std::vector<int64_t>>(count);
-    std::vector<float> columns[3] = {std::vector<float>(count), std::vector<float>(count),
-                                     std::vector<float>(count)};
-    std::vector<int64_t>& keyTimes = *pKeyTimes;
+    auto pKeyTimes = std::make_shared<FbxKeyTimes>(count);
+    FbxKeyValues columns[3] = {FbxKeyValues(count), FbxKeyValues(count), FbxKeyValues(count)};
+    FbxKeyTimes& keyTimes = *pKeyTimes;
     for (size_t i = 0; i < count; ++i) {
       const size_t k = size_t(i_rKept[i]);
       const Vec3 v = i_value(int(k));

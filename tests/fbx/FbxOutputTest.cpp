@@ -5,6 +5,7 @@
 #include "fbx/FbxAnimation.h"
 #include "fbx/FbxByteSink.h"
 #include "fbx/FbxDeflater.h"
+#include "fbx/FbxKeyStore.h"
 #include "fbx/FbxRecordWriter.h"
 #include "fbx/FbxScene.h"
 #include <cstdio>
@@ -179,7 +180,7 @@ TEST(FbxAnimCurveTest, KeysInBulkEqualKeysOneByOne) {
       pSingle->KeySetInterpolation(index, type);
     }
   }
-  EXPECT_EQ(pBulk->times(), (std::vector<int64_t>{5, 10, 20, 25, 30, 40, 50, 60}));
+  EXPECT_EQ(pBulk->times(), (FbxKeyTimes{5, 10, 20, 25, 30, 40, 50, 60}));
   EXPECT_EQ(pBulk->times(), pSingle->times());
   EXPECT_EQ(pBulk->values(), pSingle->values());
   using Run = FbxAnimCurve::FlagRun;
@@ -196,7 +197,7 @@ TEST(FbxAnimCurveTest, KeysInBulkEqualKeysOneByOne) {
   EXPECT_EQ(pBulk->flagRuns(), (std::vector<Run>{{0x4, 5}, {0x2, 3}}));
 
   // Curves that take over shared times: a change to one leaves the others as they were.
-  auto pTimes = std::make_shared<std::vector<int64_t>>(std::vector<int64_t>{1, 2, 3});
+  auto pTimes = std::make_shared<FbxKeyTimes>(FbxKeyTimes{1, 2, 3});
   FbxAnimCurve* pShared[2] = {pNode->LclRotation.GetCurve(pLayer, "X", true),
                               pNode->LclRotation.GetCurve(pLayer, "Y", true)};
   for (FbxAnimCurve* pCurve : pShared)
@@ -204,17 +205,45 @@ TEST(FbxAnimCurveTest, KeysInBulkEqualKeysOneByOne) {
   EXPECT_EQ(&pShared[0]->times(), &pShared[1]->times());
   pShared[1]->KeySetValue(pShared[1]->KeyAdd(FbxTime(2)), 9.0f);
   pShared[1]->KeyAdd(FbxTime(0));
-  EXPECT_EQ(pShared[0]->times(), (std::vector<int64_t>{1, 2, 3}));
-  EXPECT_EQ(pShared[0]->values(), (std::vector<float>{0.5f, 1.5f, 2.5f}));
-  EXPECT_EQ(pShared[1]->times(), (std::vector<int64_t>{0, 1, 2, 3}));
-  EXPECT_EQ(pShared[1]->values(), (std::vector<float>{0.0f, 0.5f, 9.0f, 2.5f}));
+  EXPECT_EQ(pShared[0]->times(), (FbxKeyTimes{1, 2, 3}));
+  EXPECT_EQ(pShared[0]->values(), (FbxKeyValues{0.5f, 1.5f, 2.5f}));
+  EXPECT_EQ(pShared[1]->times(), (FbxKeyTimes{0, 1, 2, 3}));
+  EXPECT_EQ(pShared[1]->values(), (FbxKeyValues{0.0f, 0.5f, 9.0f, 2.5f}));
   EXPECT_EQ(pShared[1]->flagRuns(), (std::vector<Run>{{0x108, 1}, {0x4, 3}}));
   // Times that do not increase are taken key by key.
   FbxAnimCurve* pUnsorted = pNode->LclScaling.GetCurve(pLayer, "X", true);
-  pUnsorted->addKeys(std::make_shared<std::vector<int64_t>>(std::vector<int64_t>{3, 1, 3}),
-                     {1.0f, 2.0f, 3.0f}, FbxAnimCurveDef::eInterpolationLinear);
-  EXPECT_EQ(pUnsorted->times(), (std::vector<int64_t>{1, 3}));
-  EXPECT_EQ(pUnsorted->values(), (std::vector<float>{2.0f, 3.0f}));
+  pUnsorted->addKeys(std::make_shared<FbxKeyTimes>(FbxKeyTimes{3, 1, 3}), {1.0f, 2.0f, 3.0f},
+                     FbxAnimCurveDef::eInterpolationLinear);
+  EXPECT_EQ(pUnsorted->times(), (FbxKeyTimes{1, 3}));
+  EXPECT_EQ(pUnsorted->values(), (FbxKeyValues{2.0f, 3.0f}));
   pScene->Destroy();
   pManager->Destroy();
+}
+
+TEST(FbxKeyStoreTest, LargeArraysShareSlabsThatGoWithTheirLastArray) {
+  const size_t before = FbxKeyStore::slabCount();
+  {
+    // 40 arrays of 1 MiB fill more than one slab; one of 12 MiB gets a slab of its own; small
+    // arrays never make one.
+    std::vector<FbxKeyTimes> arrays;
+    for (int a = 0; a < 40; ++a) {
+      arrays.emplace_back(size_t(1) << 17);
+      for (size_t i = 0; i < arrays.back().size(); ++i)
+        arrays.back()[i] = int64_t(a) * 1000000 + int64_t(i);
+    }
+    FbxKeyValues big(size_t(3) << 20, 0.5f);
+    FbxKeyValues small(100, 1.0f);
+    EXPECT_EQ(FbxKeyStore::slabCount(), before + 3);
+    for (int a = 0; a < 40; a += 2)
+      arrays[size_t(a)] = FbxKeyTimes(); // give back every other array
+    EXPECT_EQ(FbxKeyStore::slabCount(), before + 3);
+    for (int a = 1; a < 40; a += 2) {
+      const FbxKeyTimes& rArray = arrays[size_t(a)];
+      EXPECT_EQ(rArray.front(), int64_t(a) * 1000000);
+      EXPECT_EQ(rArray.back(), int64_t(a) * 1000000 + int64_t(rArray.size()) - 1);
+    }
+    EXPECT_EQ(big[size_t(3) << 19], 0.5f);
+    EXPECT_EQ(reinterpret_cast<uintptr_t>(arrays[1].data()) % 64, 0u);
+  }
+  EXPECT_EQ(FbxKeyStore::slabCount(), before);
 }
