@@ -1,9 +1,12 @@
 #pragma once
 // Animation: stacks (takes), their layers, and the curves that animate node properties. A curve
 // keeps its key times, values and flags in three flat arrays, the form the file stores.
+#include "fbx/FbxKeyStore.h"
 #include "fbx/FbxNode.h"
 #include "fbx/FbxTime.h"
 #include <cstdint>
+#include <memory>
+#include <span>
 #include <string>
 #include <vector>
 
@@ -66,6 +69,13 @@ private:
 
 class FbxAnimCurve : public FbxObject {
 public:
+  /// Keys in a row with the same flags: the form the file stores flags in.
+  struct FlagRun {
+    uint32_t flags;
+    uint32_t count;
+    bool operator==(const FlagRun&) const = default;
+  };
+
   /// Room for this many keys.
   void ResizeKeyBuffer(int i_count);
   void KeyModifyBegin() {}
@@ -76,24 +86,38 @@ public:
   void KeySetValue(int i_index, float i_value) { m_values[size_t(i_index)] = i_value; }
   /// Replaces the interpolation bits of a key's flags.
   void KeySetInterpolation(int i_index, FbxAnimCurveDef::EInterpolationType i_type);
-  int KeyGetCount() const { return int(m_times.size()); }
-  FbxTime KeyGetTime(int i_index) const { return FbxTime(m_times[size_t(i_index)]); }
+  /// Adds many keys at once, with the result of KeyAdd, KeySetValue and KeySetInterpolation
+  /// called key by key. Times after the last key, strictly increasing, are appended whole.
+  void addKeys(std::span<const int64_t> i_times, std::span<const float> i_values,
+               FbxAnimCurveDef::EInterpolationType i_type);
+  /// The same, taking the arrays over instead of copying them when the curve has no keys and
+  /// the times strictly increase: the times may be shared by other curves (each copies them
+  /// before it changes them).
+  void addKeys(std::shared_ptr<FbxKeyTimes> i_pTimes, FbxKeyValues i_values,
+               FbxAnimCurveDef::EInterpolationType i_type);
+  int KeyGetCount() const { return int(m_pTimes->size()); }
+  FbxTime KeyGetTime(int i_index) const { return FbxTime((*m_pTimes)[size_t(i_index)]); }
   float KeyGetValue(int i_index) const { return m_values[size_t(i_index)]; }
-  uint32_t KeyGetFlags(int i_index) const { return m_flags[size_t(i_index)]; }
+  uint32_t KeyGetFlags(int i_index) const;
 
-  const std::vector<int64_t>& times() const { return m_times; }
-  const std::vector<float>& values() const { return m_values; }
-  std::vector<float>& values() { return m_values; }
-  const std::vector<uint32_t>& flags() const { return m_flags; }
-  /// Bytes of key data held.
-  size_t keyBytes() const;
+  const FbxKeyTimes& times() const { return *m_pTimes; }
+  const FbxKeyValues& values() const { return m_values; }
+  FbxKeyValues& values() { return m_values; }
+  /// Flags run-length encoded, neighbouring runs always different.
+  const std::vector<FlagRun>& flagRuns() const { return m_flagRuns; }
 
 private:
   friend class FbxAnimatableDouble3;
   using FbxObject::FbxObject;
-  std::vector<int64_t> m_times;
-  std::vector<float> m_values;
-  std::vector<uint32_t> m_flags;
+  FbxKeyTimes& ownTimes();
+  /// The run holding a key and the key's place in it.
+  std::pair<size_t, uint32_t> runOf(size_t i_index) const;
+  void insertFlags(size_t i_index, uint32_t i_flags);
+  void mergeRuns(size_t i_first, size_t i_last);
+
+  std::shared_ptr<FbxKeyTimes> m_pTimes = std::make_shared<FbxKeyTimes>();
+  FbxKeyValues m_values;
+  std::vector<FlagRun> m_flagRuns;
 };
 
 /// The curves of one property on one layer, one per channel.

@@ -557,25 +557,24 @@ private:
     leafD("Default", {double(i_rCurve.values().front())});
     leafI("KeyVer", 4009);
     m_rWriter.begin("KeyTime");
-    m_rWriter.propArray(std::span<const int64_t>(i_rCurve.times()));
+    m_rWriter.propArrayView(std::span<const int64_t>(i_rCurve.times()));
     m_rWriter.end();
     m_rWriter.begin("KeyValueFloat");
-    m_rWriter.propArray(std::span<const float>(i_rCurve.values()));
+    m_rWriter.propArrayView(std::span<const float>(i_rCurve.values()));
     m_rWriter.end();
     // Attributes run-length encoded: one entry per run of keys with equal flags.
-    std::vector<int32_t> flags, counts;
-    const std::vector<uint32_t>& keyFlags = i_rCurve.flags();
-    for (size_t k = 0; k < keyFlags.size(); ++k) {
-      if (k == 0 || keyFlags[k] != keyFlags[k - 1]) {
-        flags.push_back(int32_t(keyFlags[k]));
-        counts.push_back(0);
-      }
-      ++counts.back();
+    std::vector<int32_t>& flags = m_flags;
+    std::vector<int32_t>& counts = m_counts;
+    flags.clear();
+    counts.clear();
+    for (const FbxAnimCurve::FlagRun& run : i_rCurve.flagRuns()) {
+      flags.push_back(int32_t(run.flags));
+      counts.push_back(int32_t(run.count));
     }
     // Slopes 0, weights 1/3 each (packed as 0x0D05 twice), no velocity.
     const float weights = std::bit_cast<float>(uint32_t(0x0D050D05));
-    std::vector<float> data;
-    data.reserve(flags.size() * 4);
+    std::vector<float>& data = m_attributeData;
+    data.clear();
     for (size_t i = 0; i < flags.size(); ++i)
       data.insert(data.end(), {0.0f, 0.0f, weights, 0.0f});
     m_rWriter.begin("KeyAttrFlags");
@@ -661,6 +660,9 @@ private:
   VFbxRecordWriter& m_rWriter;
   std::vector<const FbxNode*> m_nodes;
   std::unordered_set<const FbxNode*> m_nodeSet;
+  // A curve's attribute arrays, kept between curves to save allocations.
+  std::vector<int32_t> m_flags, m_counts;
+  std::vector<float> m_attributeData;
 };
 
 } // namespace

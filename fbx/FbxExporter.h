@@ -35,7 +35,8 @@ public:
   /// unknown string. The default is "FBX202000".
   bool SetFileExportVersion(const char* i_pVersionString, int i_renameMode = 0);
   uint32_t fileVersion() const { return m_version; }
-  /// Arrays above this many bytes are compressed (default 128).
+  /// Arrays above this many bytes are compressed with zlib; by default none is (see
+  /// docs/fbx.md: for key data the time outweighs the space).
   void setCompressionThreshold(size_t i_bytes) { m_compressionThreshold = i_bytes; }
 
   /// Output to a path. False when the path's folder cannot take a new file.
@@ -50,7 +51,7 @@ public:
 private:
   using FbxObject::FbxObject;
   uint32_t m_version = 7700;
-  size_t m_compressionThreshold = 128;
+  size_t m_compressionThreshold = SIZE_MAX;
   std::string m_path;
   std::FILE* m_pStream = nullptr;
   bool m_initialized = false;

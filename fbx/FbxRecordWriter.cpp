@@ -1,7 +1,6 @@
 #include "FbxRecordWriter.h"
 #include <cstring>
 #include <stdexcept>
-#include <zlib.h>
 
 namespace AnvilFbx {
 
@@ -9,6 +8,7 @@ namespace {
 const char kMagic[23] = "Kaydara FBX Binary  \0\x1a";
 const uint8_t kFooterMagic[16] = {0xF8, 0x5A, 0x8C, 0x6A, 0xDE, 0xF5, 0xD9, 0x7E,
                                   0xEC, 0xE9, 0x0C, 0xE3, 0x75, 0x8F, 0x29, 0x0B};
+constexpr size_t kViewBytes = 16384;
 } // namespace
 
 VFbxRecordWriter::VFbxRecordWriter(VFbxByteSink& io_rSink, uint32_t i_version,
@@ -103,28 +103,30 @@ void VFbxRecordWriter::propR(std::span<const uint8_t> i_bytes) {
 }
 
 void VFbxRecordWriter::array(char i_type, const void* i_pData, uint32_t i_count,
-                             size_t i_elementSize) {
+                             size_t i_elementSize, bool i_view) {
   property(i_type);
   const size_t bytes = size_t(i_count) * i_elementSize;
   if (bytes > m_threshold) {
-    uLongf compressedSize = compressBound(uLong(bytes));
-    if (m_scratch.size() < compressedSize) m_scratch.resize(compressedSize);
-    // Level 1: key data are large and the time saved outweighs the few bytes more.
-    if (compress2(m_scratch.data(), &compressedSize, static_cast<const Bytef*>(i_pData),
-                  uLong(bytes), 1) == Z_OK &&
-        compressedSize < bytes) {
-      putValue<uint32_t>(i_count);
-      putValue<uint32_t>(1);
-      putValue<uint32_t>(uint32_t(compressedSize));
-      put(m_scratch.data(), compressedSize);
+    // The header's stored length is patched once the compressed length is known.
+    const uint64_t header = m_rSink.size();
+    const uint32_t fields[3] = {i_count, 1, 0};
+    put(fields, sizeof fields);
+    if (const size_t compressedSize = m_deflater.compress(i_pData, bytes, m_rSink)) {
+      const uint32_t stored = uint32_t(compressedSize);
+      m_rSink.patch(header + 8, &stored, sizeof stored);
       ++m_compressed;
       return;
     }
+    m_rSink.truncate(header);
   }
   putValue<uint32_t>(i_count);
   putValue<uint32_t>(0);
   putValue<uint32_t>(uint32_t(bytes));
-  put(i_pData, bytes);
+  // Below a few pages a view costs more than the copy it saves.
+  if (i_view && bytes >= kViewBytes)
+    m_rSink.appendView(i_pData, bytes);
+  else
+    put(i_pData, bytes);
 }
 
 void VFbxRecordWriter::propArray(std::span<const float> i_values) {
@@ -138,6 +140,13 @@ void VFbxRecordWriter::propArray(std::span<const int64_t> i_values) {
 }
 void VFbxRecordWriter::propArray(std::span<const int32_t> i_values) {
   array('i', i_values.data(), uint32_t(i_values.size()), sizeof(int32_t));
+}
+
+void VFbxRecordWriter::propArrayView(std::span<const float> i_values) {
+  array('f', i_values.data(), uint32_t(i_values.size()), sizeof(float), true);
+}
+void VFbxRecordWriter::propArrayView(std::span<const int64_t> i_values) {
+  array('l', i_values.data(), uint32_t(i_values.size()), sizeof(int64_t), true);
 }
 
 void VFbxRecordWriter::finish(const uint8_t (&i_rFooterId)[16]) {

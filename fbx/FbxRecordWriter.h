@@ -3,6 +3,7 @@
 // lists, arrays compressed with zlib above a threshold, and the footer. Record headers are
 // 32-bit below version 7500 and 64-bit from it on.
 #include "fbx/FbxByteSink.h"
+#include "fbx/FbxDeflater.h"
 #include <cstdint>
 #include <span>
 #include <string_view>
@@ -36,6 +37,10 @@ public:
   void propArray(std::span<const double> i_values);
   void propArray(std::span<const int64_t> i_values);
   void propArray(std::span<const int32_t> i_values);
+  /// Arrays whose values stay alive and unchanged until the sink is written. Those stored raw
+  /// that are large go out from where they lie instead of being copied.
+  void propArrayView(std::span<const float> i_values);
+  void propArrayView(std::span<const int64_t> i_values);
 
   /// Ends the top-level list and writes the footer. `i_rFooterId` is the 16-byte id written
   /// after the last record.
@@ -54,7 +59,8 @@ private:
     bool hasChildren;
   };
   void property(char i_type);
-  void array(char i_type, const void* i_pData, uint32_t i_count, size_t i_elementSize);
+  void array(char i_type, const void* i_pData, uint32_t i_count, size_t i_elementSize,
+             bool i_view = false);
   void put(const void* i_pData, size_t i_size) { m_rSink.append(i_pData, i_size); }
   template <typename T> void putValue(T i_value) { put(&i_value, sizeof i_value); }
   void nullRecord();
@@ -64,7 +70,7 @@ private:
   bool m_wide;
   size_t m_threshold;
   std::vector<Open> m_open;
-  std::vector<uint8_t> m_scratch;
+  VFbxDeflater m_deflater;
   int m_compressed = 0;
 };
 

@@ -10,8 +10,10 @@ double nearestTurn(double i_angle, double i_reference) {
 }
 
 bool sameKeyTimes(FbxAnimCurve* const* i_ppCurves) {
-  return i_ppCurves[0]->times() == i_ppCurves[1]->times() &&
-         i_ppCurves[0]->times() == i_ppCurves[2]->times();
+  auto same = [](const FbxAnimCurve* i_pA, const FbxAnimCurve* i_pB) {
+    return &i_pA->times() == &i_pB->times() || i_pA->times() == i_pB->times(); // shared or equal
+  };
+  return same(i_ppCurves[0], i_ppCurves[1]) && same(i_ppCurves[0], i_ppCurves[2]);
 }
 } // namespace
 
@@ -22,7 +24,7 @@ bool FbxAnimCurveFilterUnroll::Apply(FbxAnimCurve** i_ppCurves, int i_count) {
 
   if (!sameKeyTimes(i_ppCurves)) {
     for (int c = 0; c < 3; ++c) {
-      std::vector<float>& values = i_ppCurves[c]->values();
+      FbxKeyValues& values = i_ppCurves[c]->values();
       for (size_t k = 1; k < values.size(); ++k)
         values[k] = float(nearestTurn(values[k], values[k - 1]));
     }
@@ -32,8 +34,8 @@ bool FbxAnimCurveFilterUnroll::Apply(FbxAnimCurve** i_ppCurves, int i_count) {
   // Angles indexed by the order's application sequence: first, middle, last axis.
   static const int kAxes[6][3] = {{0, 1, 2}, {0, 2, 1}, {1, 2, 0}, {1, 0, 2}, {2, 0, 1}, {2, 1, 0}};
   const int* axes = kAxes[int(m_order)];
-  std::vector<float>* channels[3] = {&i_ppCurves[0]->values(), &i_ppCurves[1]->values(),
-                                     &i_ppCurves[2]->values()};
+  FbxKeyValues* channels[3] = {&i_ppCurves[0]->values(), &i_ppCurves[1]->values(),
+                               &i_ppCurves[2]->values()};
   const size_t count = channels[0]->size();
   double previous[3] = {};
   for (size_t k = 0; k < count; ++k) {

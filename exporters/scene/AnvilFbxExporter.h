@@ -1,9 +1,11 @@
 #pragma once
+#include "fbx/FbxKeyStore.h"
 #include "plugin/host/AnvilRotation.h"
 #include "plugin/host/FileExporter.h"
 #include "plugin/host/Vec3.h"
 #include <cstdint>
 #include <map>
+#include <memory>
 #include <set>
 #include <vector>
 
@@ -146,4 +148,13 @@ private:
   int64_t m_rangeStart = 0, m_rangeEnd = 0;
   bool m_rangeOnly = false;
   int m_rootsExported = 0;
+  // The kept keys of the last track written and their FBX times, for the take it was written
+  // to: the next track with the same key times (every marker of a take, as a rule) shares them.
+  struct KeyTimes {
+    const AnvilFbx::FbxAnimLayer* m_pLayer = nullptr;
+    std::vector<int64_t> m_hostTimes;
+    std::vector<int> m_kept;
+    std::shared_ptr<AnvilFbx::FbxKeyTimes> m_pFbxTimes;
+  };
+  KeyTimes m_lastKeyTimes;
 };

@@ -24,6 +24,7 @@
 #include "plugin/host/SolvingSetup.h"
 #include "plugin/host/VideoCamera.h"
 #include <filesystem>
+#include <memory>
 
 using namespace AnvilFbx;
 
@@ -382,34 +383,41 @@ void AnvilFbxExporter::writeCurves(const Pass& i_rPass, FbxNode* i_pFbx, Node* i
     time.SetSecondDouble(pTime->getTimeInSeconds(i_t + offset));
     return time;
   };
-  // Keys of a track that the take keeps.
-  auto keptKeys = [&](const std::vector<HTime>& i_rTimes) {
-    std::vector<int> kept;
-    kept.reserve(i_rTimes.size());
+  // The keys of a track that the take keeps and their FBX times, shared with the track before
+  // when both have the same key times.
+  auto keyTimes = [&](const std::vector<HTime>& i_rTimes) -> const KeyTimes& {
+    KeyTimes& last = m_lastKeyTimes;
+    if (last.m_pLayer == pLayer && last.m_pFbxTimes && last.m_hostTimes == i_rTimes) return last;
+    last.m_pLayer = pLayer;
+    last.m_hostTimes = i_rTimes;
+    last.m_kept.clear();
     for (size_t k = 0; k < i_rTimes.size(); ++k)
-      if (keepKey(i_rTimes[k])) kept.push_back(int(k));
-    return kept;
+      if (keepKey(i_rTimes[k])) last.m_kept.push_back(int(k));
+    last.m_pFbxTimes = std::make_shared<FbxKeyTimes>(last.m_kept.size());
+    for (size_t i = 0; i < last.m_kept.size(); ++i)
+      (*last.m_pFbxTimes)[i] = fbxTime(i_rTimes[size_t(last.m_kept[i])]).Get();
+    return last;
   };
-  // Three curves of a property, one key per kept index, values from `i_value`.
+  // Three curves of a property, one key per kept key of the track, values from `i_value`. The
+  // values are gathered column by column into arrays that the curves take over.
   auto writeVector = [&](FbxAnimatableDouble3& io_rProperty, const std::vector<HTime>& i_rTimes,
-                         const std::vector<int>& i_rKept, auto i_value, FbxAnimCurve** o_ppCurves) {
+                         auto i_value, FbxAnimCurve** o_ppCurves) {
+    const KeyTimes& times = keyTimes(i_rTimes);
+    const size_t count = times.m_kept.size();
+    FbxKeyValues columns[3] = {FbxKeyValues(count), FbxKeyValues(count), FbxKeyValues(count)};
+    for (size_t i = 0; i < count; ++i) {
+      const Vec3 v = i_value(times.m_kept[i]);
+      columns[0][i] = float(v.x);
+      columns[1][i] = float(v.y);
+      columns[2][i] = float(v.z);
+    }
     for (int a = 0; a < 3; ++a) {
       o_ppCurves[a] = io_rProperty.GetCurve(pLayer, kAxes[a], true);
-      o_ppCurves[a]->ResizeKeyBuffer(int(i_rKept.size()));
       o_ppCurves[a]->KeyModifyBegin();
-    }
-    for (int k : i_rKept) {
-      const Vec3 v = i_value(k);
-      const FbxTime time = fbxTime(i_rTimes[size_t(k)]);
-      const double values[3] = {v.x, v.y, v.z};
-      for (int a = 0; a < 3; ++a) {
-        const int index = o_ppCurves[a]->KeyAdd(time);
-        o_ppCurves[a]->KeySetValue(index, float(values[a]));
-        o_ppCurves[a]->KeySetInterpolation(index, FbxAnimCurveDef::eInterpolationLinear);
-      }
-    }
-    for (int a = 0; a < 3; ++a)
+      o_ppCurves[a]->addKeys(times.m_pFbxTimes, std::move(columns[a]),
+                             FbxAnimCurveDef::eInterpolationLinear);
       o_ppCurves[a]->KeyModifyEnd();
+    }
   };
 
   FbxAnimCurve* curves[3];
@@ -420,7 +428,7 @@ void AnvilFbxExporter::writeCurves(const Pass& i_rPass, FbxNode* i_pFbx, Node* i
     const std::vector<HTime>& times = pMarker->m_track.times();
     const FbxTransforms::MarkerSpace space(pParentHost);
     writeVector(
-        i_pFbx->LclTranslation, times, keptKeys(times),
+        i_pFbx->LclTranslation, times,
         [&](int k) {
           return space.local(pMarker->m_track.getKeyValue(k), times[size_t(k)]) *
                  kCentimetresPerMillimetre;
@@ -431,7 +439,7 @@ void AnvilFbxExporter::writeCurves(const Pass& i_rPass, FbxNode* i_pFbx, Node* i
     const FbxTransforms::Frame frame = FbxTransforms::parentCorrection(i_pHost, pParentHost);
     const Vec3 pre = i_pHost->getPreTranslation();
     writeVector(
-        i_pFbx->LclTranslation, times, keptKeys(times),
+        i_pFbx->LclTranslation, times,
         [&](int k) {
           return frame.apply(pre + i_pHost->m_positionTrack.getKeyValue(k)) *
                  kCentimetresPerMillimetre;
@@ -442,7 +450,7 @@ void AnvilFbxExporter::writeCurves(const Pass& i_rPass, FbxNode* i_pFbx, Node* i
     const std::vector<HTime>& times = i_pHost->m_rotationTrack.times();
     const AnvilRotation::RotOrder order = i_pHost->getRotationOrder();
     writeVector(
-        i_pFbx->LclRotation, times, keptKeys(times),
+        i_pFbx->LclRotation, times,
         [&](int k) {
           Vec3 euler;
           i_pHost->m_rotationTrack.getKeyValue(k).getAsEuler(order, euler);
@@ -459,7 +467,7 @@ void AnvilFbxExporter::writeCurves(const Pass& i_rPass, FbxNode* i_pFbx, Node* i
   if (!i_pHost->m_scaleTrack.isEmpty()) {
     const std::vector<HTime>& times = i_pHost->m_scaleTrack.times();
     writeVector(
-        i_pFbx->LclScaling, times, keptKeys(times),
+        i_pFbx->LclScaling, times,
         [&](int k) { return i_pHost->m_scaleTrack.getKeyValue(k) * 1.0; }, curves);
   }
 }

@@ -42,6 +42,7 @@ bool AnvilFbxExporter::write() {
 
   m_pScene = FbxScene::Create(m_pManager, m_filePath.GetStr());
   auto destroyScene = [this] {
+    m_lastKeyTimes = KeyTimes(); // its FBX times die with the scene's curves
     m_pScene->Destroy();
     m_pScene = nullptr;
   };
