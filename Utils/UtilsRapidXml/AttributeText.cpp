@@ -146,22 +146,31 @@ bool ParseDouble(std::string_view text, double& o_rValue) {
 }
 
 std::string FormatDouble(double value) {
-  std::string text;
-  AppendDouble(text, value);
-  return text;
+  char buffer[40];
+  return std::string(FormatDouble(value, buffer));
 }
 
 void AppendDouble(std::string& io_rText, double value) {
-  if (value == 0.0) { // never "-0": a sign on zero is an artefact of arithmetic
-    io_rText += '0';
-    return;
+  char buffer[40];
+  io_rText += FormatDouble(value, buffer);
+}
+
+std::string_view FormatDouble(double value, char (&buffer)[40]) {
+  if (value == 0.0) return "0"; // never "-0": a sign on zero is an artefact of arithmetic
+  // An integer below 10^15 prints under "%.17g" as its digits alone: write them directly.
+  if (value > -1e15 && value < 1e15) {
+    const auto whole = static_cast<std::int64_t>(value);
+    if (static_cast<double>(whole) == value) {
+      const auto [end, error] = std::to_chars(buffer, buffer + 40, whole);
+      return {buffer, static_cast<std::size_t>(end - buffer)};
+    }
   }
   // to_chars with a precision is specified as printf's "%.17g" in the C locale, inf and nan
   // spellings included, and needs neither the locale nor a format string.
-  char buffer[40];
   const auto [end, error] =
-      std::to_chars(buffer, buffer + sizeof buffer, value, std::chars_format::general, 17);
-  if (error == std::errc()) io_rText.append(buffer, end);
+      std::to_chars(buffer, buffer + 40, value, std::chars_format::general, 17);
+  if (error != std::errc()) return {};
+  return {buffer, static_cast<std::size_t>(end - buffer)};
 }
 
 bool ParseBool(std::string_view text, bool& o_rValue) {

@@ -31,6 +31,8 @@ bool ParseShortDecimal(std::string_view text, double& o_rValue);
 std::string FormatDouble(double value);
 /// Appends FormatDouble's text of `value` to `io_rText`.
 void AppendDouble(std::string& io_rText, double value);
+/// FormatDouble's text of `value` in `buffer`.
+std::string_view FormatDouble(double value, char (&buffer)[40]);
 
 /// Trimmed "0" / "1", else case-insensitive "true" / "false".
 bool ParseBool(std::string_view text, bool& o_rValue);
