@@ -2,6 +2,7 @@
 // against rapidxml parsing and printing the same document alone: the ratio is what the schema
 // layer, the records and the expression passes cost on top of the XML itself.
 
+#include "RatioReporter.h"
 #include "River/CoreOstraKMTIO/Reader.h"
 #include "River/CoreOstraKMTIO/Writer.h"
 #include "River/CoreOstraTypes/NameHash.h"
@@ -138,4 +139,12 @@ BENCHMARK(BM_KmtWrite)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_RapidXmlPrint)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_KmtRead)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_RapidXmlParse)->Unit(benchmark::kMillisecond);
-BENCHMARK_MAIN();
+int main(int argc, char** argv) {
+  benchmark::Initialize(&argc, argv);
+  Bench::RatioReporter reporter;
+  benchmark::RunSpecifiedBenchmarks(&reporter);
+  reporter.printRatio("KMT read / bare rapidxml parse", "BM_KmtRead", "BM_RapidXmlParse");
+  reporter.printRatio("KMT write / bare rapidxml print", "BM_KmtWrite", "BM_RapidXmlPrint");
+  benchmark::Shutdown();
+  return 0;
+}

@@ -15,15 +15,17 @@
 #include <cstdint>
 #include <optional>
 #include <string>
+#include <string_view>
+#include <unordered_map>
 
 namespace CoreOstraKMTIO::Detail {
 
 using UtilsRapidXml::INode;
 
-inline const std::string XsdString = "xsd:string";
-inline const std::string XsdDouble = "xsd:double";
-inline const std::string XsdId = "xsd:ID";
-inline const std::string XsdIdRef = "xsd:IDREF";
+inline constexpr std::string_view XsdString = "xsd:string";
+inline constexpr std::string_view XsdDouble = "xsd:double";
+inline constexpr std::string_view XsdId = "xsd:ID";
+inline constexpr std::string_view XsdIdRef = "xsd:IDREF";
 
 /// Deepest segment nesting a file may have; deeper files are refused rather than recursed.
 inline constexpr std::uint32_t MaxSegmentDepth = 1000;
@@ -39,8 +41,20 @@ struct VReadContext {
   IVersion m_FileVersion{1, 0};
   bool m_Refused = false; ///< the root refused the file (version or development flag)
 
+  /// The first segment or marker of that name.
   std::optional<std::uint32_t> FindSegment(const std::string& name) const;
   std::optional<std::uint32_t> FindMarker(const std::string& name) const;
+  /// Drops the segments from `index` on, with their display and extra records.
+  void DropSegmentsFrom(std::uint32_t index);
+
+  /// First index of each name among the first m_Count records, extended as records are added:
+  /// the lookups of targets and markers would otherwise walk the lists each time.
+  struct VNameIndex {
+    std::unordered_map<std::string, std::uint32_t> m_First;
+    std::size_t m_Count = 0;
+  };
+  mutable VNameIndex m_SegmentNames{};
+  mutable VNameIndex m_MarkerNames{};
 };
 
 /// The document: one KinematicModel.
@@ -56,8 +70,8 @@ void DeclareSubspace(INode& node, VReadContext& context);
 
 /// Exactly N expressions into a fixed array.
 template <std::size_t N>
-bool ReadExpressions(INode& node, const std::string& name, std::array<std::string, N>& o_rValue,
-                     const std::string& documentation, bool required,
+bool ReadExpressions(INode& node, std::string_view name, std::array<std::string, N>& o_rValue,
+                     std::string_view documentation, bool required,
                      const IVersion& lower = Versions::None,
                      const IVersion& upper = Versions::None) {
   std::vector<std::string> values;
@@ -71,8 +85,8 @@ bool ReadExpressions(INode& node, const std::string& name, std::array<std::strin
 
 /// Exactly N numbers into a fixed array.
 template <std::size_t N>
-bool ReadNumbers(INode& node, const std::string& name, std::array<double, N>& o_rValue,
-                 const std::string& documentation, const IVersion& lower = Versions::None,
+bool ReadNumbers(INode& node, std::string_view name, std::array<double, N>& o_rValue,
+                 std::string_view documentation, const IVersion& lower = Versions::None,
                  const IVersion& upper = Versions::None) {
   std::vector<double> values;
   if (!UtilsRapidXml::ReadDoubleList(node, name, values, N, 0, documentation, XsdString, false,
@@ -84,21 +98,21 @@ bool ReadNumbers(INode& node, const std::string& name, std::array<double, N>& o_
 }
 
 /// A list of numbers of a given count (AnyCount for any) into a vector.
-bool ReadNumberList(INode& node, const std::string& name, std::vector<double>& o_rValues,
-                    std::size_t count, const std::string& documentation, bool required = false,
+bool ReadNumberList(INode& node, std::string_view name, std::vector<double>& o_rValues,
+                    std::size_t count, std::string_view documentation, bool required = false,
                     const IVersion& lower = Versions::None, const IVersion& upper = Versions::None);
 
 /// A plain text attribute.
-bool ReadText(INode& node, const std::string& name, std::string& o_rValue,
-              const std::string& documentation, bool required = false,
+bool ReadText(INode& node, std::string_view name, std::string& o_rValue,
+              std::string_view documentation, bool required = false,
               const IVersion& lower = Versions::None, const IVersion& upper = Versions::None);
 
 /// HIDDEN: stores its negation in `io_rVisible`.
-bool ReadHidden(INode& node, bool& io_rVisible, const std::string& documentation, bool required,
+bool ReadHidden(INode& node, bool& io_rVisible, std::string_view documentation, bool required,
                 const IVersion& lower = Versions::None);
 
 /// OPACITY: a number clamped to 0..255 as the alpha byte; 255 when absent.
-std::uint8_t ReadOpacity(INode& node, const std::string& documentation,
+std::uint8_t ReadOpacity(INode& node, std::string_view documentation,
                          const IVersion& lower = Versions::None);
 
 /// A direction made unit when it is at least 0.001 long; otherwise left as it is.

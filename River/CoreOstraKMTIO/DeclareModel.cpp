@@ -13,22 +13,39 @@ using namespace Versions;
 using namespace UtilsRapidXml;
 using CoreOstraTypes::VSubjectParametrised;
 
+namespace {
+
+template <class TRecord>
+std::optional<std::uint32_t> FindByName(const std::vector<TRecord>& records,
+                                        VReadContext::VNameIndex& index, const std::string& name) {
+  if (records.size() < index.m_Count) index = {};
+  for (; index.m_Count < records.size(); ++index.m_Count) {
+    index.m_First.emplace(records[index.m_Count].m_Name, static_cast<std::uint32_t>(index.m_Count));
+  }
+  const auto it = index.m_First.find(name);
+  if (it == index.m_First.end()) return std::nullopt;
+  return it->second;
+}
+
+} // namespace
+
 std::optional<std::uint32_t> VReadContext::FindSegment(const std::string& name) const {
-  const auto& segments = m_rSubject.m_Segments;
-  for (std::size_t i = 0; i < segments.size(); ++i)
-    if (segments[i].m_Name == name) return static_cast<std::uint32_t>(i);
-  return std::nullopt;
+  return FindByName(m_rSubject.m_Segments, m_SegmentNames, name);
 }
 
 std::optional<std::uint32_t> VReadContext::FindMarker(const std::string& name) const {
-  const auto& markers = m_rSubject.m_Markers;
-  for (std::size_t i = 0; i < markers.size(); ++i)
-    if (markers[i].m_Name == name) return static_cast<std::uint32_t>(i);
-  return std::nullopt;
+  return FindByName(m_rSubject.m_Markers, m_MarkerNames, name);
 }
 
-bool ReadNumberList(INode& node, const std::string& name, std::vector<double>& o_rValues,
-                    std::size_t count, const std::string& documentation, bool required,
+void VReadContext::DropSegmentsFrom(std::uint32_t index) {
+  m_rSubject.m_Segments.resize(index);
+  m_rAppData.m_Segments.resize(index);
+  m_rExtras.m_Segments.resize(index);
+  m_SegmentNames = {};
+}
+
+bool ReadNumberList(INode& node, std::string_view name, std::vector<double>& o_rValues,
+                    std::size_t count, std::string_view documentation, bool required,
                     const IVersion& lower, const IVersion& upper) {
   std::vector<double> values;
   if (!ReadDoubleList(node, name, values, count, 0, documentation, XsdString, required, lower,
@@ -39,13 +56,13 @@ bool ReadNumberList(INode& node, const std::string& name, std::vector<double>& o
   return true;
 }
 
-bool ReadText(INode& node, const std::string& name, std::string& o_rValue,
-              const std::string& documentation, bool required, const IVersion& lower,
+bool ReadText(INode& node, std::string_view name, std::string& o_rValue,
+              std::string_view documentation, bool required, const IVersion& lower,
               const IVersion& upper) {
   return ReadString(node, name, o_rValue, documentation, XsdString, required, lower, upper);
 }
 
-bool ReadHidden(INode& node, bool& io_rVisible, const std::string& documentation, bool required,
+bool ReadHidden(INode& node, bool& io_rVisible, std::string_view documentation, bool required,
                 const IVersion& lower) {
   bool hidden = !io_rVisible;
   if (!ReadBool(node, "HIDDEN", hidden, documentation, XsdString, required, lower)) return false;
@@ -53,7 +70,7 @@ bool ReadHidden(INode& node, bool& io_rVisible, const std::string& documentation
   return true;
 }
 
-std::uint8_t ReadOpacity(INode& node, const std::string& documentation, const IVersion& lower) {
+std::uint8_t ReadOpacity(INode& node, std::string_view documentation, const IVersion& lower) {
   double opacity = 255.0;
   ReadDouble(node, "OPACITY", opacity, documentation, XsdDouble, false, lower);
   if (std::isnan(opacity)) return 255;

@@ -256,9 +256,7 @@ void DeclareSegment(INode& node, VReadContext& context, ZMT::IOptional<std::uint
 
   if (node.ErrorCount() != errors) {
     // Drop the segment with everything below it; they follow it in depth-first order.
-    subject.m_Segments.resize(index);
-    context.m_rAppData.m_Segments.resize(index);
-    context.m_rExtras.m_Segments.resize(index);
+    context.DropSegmentsFrom(index);
   }
 }
 

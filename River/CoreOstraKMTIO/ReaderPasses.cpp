@@ -6,7 +6,9 @@
 #include "River/CoreOstraTypesUtils/GenericDynamicSubspace.h"
 #include "River/CoreOstraTypesUtils/JointAxes.h"
 
+#include <array>
 #include <cmath>
+#include <cstring>
 
 namespace CoreOstraKMTIO::Detail {
 
@@ -20,7 +22,7 @@ namespace {
 /// Evaluates the non-empty entries only: these lists are optional.
 template <std::size_t N>
 bool EvaluateGiven(VDynamicExpressionParserSimple& parser, const std::array<std::string, N>& texts,
-                   const std::string& owner, std::vector<std::string>& o_rErrors) {
+                   const VExpressionOwner& owner, std::vector<std::string>& o_rErrors) {
   bool ok = true;
   double value = 0.0;
   for (const auto& text : texts)
@@ -85,7 +87,7 @@ bool CheckExpressions(VReadContext& context, VDynamicExpressionParserSimple& par
   for (std::size_t i = 0; i < subject.m_Segments.size(); ++i) {
     const auto& segment = subject.m_Segments[i];
     auto& extras = context.m_rExtras.m_Segments[i];
-    const std::string owner = "segment '" + segment.m_Name + "'";
+    const auto owner = VExpressionOwner::Segment(segment.m_Name);
     ok = EvaluateAll(parser, segment.m_PreRotation, owner, extras.m_PreRotation, o_rErrors) && ok;
     ok = EvaluateAll(parser, segment.m_PreTranslation, owner, extras.m_PreTranslation, o_rErrors) &&
          ok;
@@ -97,7 +99,7 @@ bool CheckExpressions(VReadContext& context, VDynamicExpressionParserSimple& par
     ok = EvaluateGiven(parser, segment.m_RadiusOfGyrationExpressions, owner, o_rErrors) && ok;
   }
   for (std::size_t i = 0; i < subject.m_Targets.size(); ++i) {
-    const std::string owner = ZMT::FormatOrRaw("target %1%", i);
+    const auto owner = VExpressionOwner::Target(i);
     double value = 0.0;
     for (const auto& text : subject.m_Targets[i].m_StateExpressions)
       ok = Evaluate(parser, text, owner, value, o_rErrors) && ok;
@@ -116,7 +118,7 @@ void CompleteJointsAndTargets(VReadContext& context, VDynamicExpressionParserSim
     const auto& extras = context.m_rExtras.m_Segments[i];
     hasTPose = hasTPose || extras.m_HasTPose;
     if (version < Versions::V3_2 && extras.m_HasPost) {
-      const std::string owner = "segment '" + segment.m_Name + "'";
+      const auto owner = VExpressionOwner::Segment(segment.m_Name);
       std::array<double, 3> rotation{}, translation{};
       if (EvaluateAll(parser, ZeroIfAbsent(extras.m_PostRotation), owner, rotation, o_rErrors) &&
           EvaluateAll(parser, ZeroIfAbsent(extras.m_PostTranslation), owner, translation,
@@ -153,27 +155,45 @@ void CompleteJointsAndTargets(VReadContext& context, VDynamicExpressionParserSim
 }
 
 bool NestsDeeperThan(const char* pText, std::size_t limit) {
+  // Most of a file is indentation and attributes: jump to each '<' with memchr and step through
+  // a tag with a table of the few characters that matter there.
+  static constexpr auto stops = [] {
+    std::array<bool, 256> table{};
+    table['\0'] = table['"'] = table['\''] = table['>'] = true;
+    return table;
+  }();
+  const char* const end = pText + std::strlen(pText);
   std::size_t depth = 0;
-  bool inTag = false;
-  char quote = 0;
-  for (const char* p = pText; *p; ++p) {
-    if (inTag) {
-      if (quote) {
-        if (*p == quote) quote = 0;
-      } else if (*p == '"' || *p == '\'') {
-        quote = *p;
-      } else if (*p == '>') {
-        inTag = false;
-        if (p > pText && p[-1] == '/' && depth > 0) --depth;
-      }
-      continue;
-    }
-    if (*p != '<') continue;
+  const char* p = pText;
+  while (p < end) {
+    p = static_cast<const char*>(std::memchr(p, '<', static_cast<std::size_t>(end - p)));
+    if (!p) return false;
     if (p[1] == '/') {
       if (depth > 0) --depth;
-    } else if (p[1] != '!' && p[1] != '?') {
-      inTag = true;
-      if (++depth > limit) return true;
+      ++p;
+      continue;
+    }
+    if (p[1] == '!' || p[1] == '?') {
+      ++p;
+      continue;
+    }
+    if (++depth > limit) return true;
+    // Inside the tag: find its '>', skipping quoted values. The text ends in a zero byte.
+    ++p;
+    while (true) {
+      while (!stops[static_cast<unsigned char>(*p)])
+        ++p;
+      if (*p == '\0') return false;
+      if (*p == '>') {
+        if (p[-1] == '/' && depth > 0) --depth;
+        ++p;
+        break;
+      }
+      const char quote = *p++;
+      while (*p && *p != quote)
+        ++p;
+      if (*p == '\0') return false;
+      ++p;
     }
   }
   return false;

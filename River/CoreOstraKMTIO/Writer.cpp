@@ -57,7 +57,7 @@ bool VWriter::PrepareExtras() {
   for (std::size_t i = 0; i < m_Subject.m_Segments.size(); ++i) {
     const auto& segment = m_Subject.m_Segments[i];
     auto& extras = m_Extras.m_Segments[i];
-    const std::string owner = "segment '" + segment.m_Name + "'";
+    const auto owner = Detail::VExpressionOwner::Segment(segment.m_Name);
     ok = Detail::EvaluateAll(parser, segment.m_PreRotation, owner, extras.m_PreRotation,
                              m_Messages) &&
          ok;

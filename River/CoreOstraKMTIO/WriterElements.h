@@ -11,6 +11,7 @@
 
 #include <array>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace CoreOstraKMTIO::Detail {
@@ -32,12 +33,12 @@ void WriteMarkerSet(VWriterNode& node, const VWriteContext& context);
 void WriteTargetSet(VWriterNode& node, const VWriteContext& context);
 
 /// A text attribute; skipped when blank unless `required`.
-bool WriteText(VWriterNode& node, const std::string& name, const std::string& value, bool required,
+bool WriteText(VWriterNode& node, std::string_view name, const std::string& value, bool required,
                const IVersion& lower = Versions::None, const IVersion& upper = Versions::None);
 
 /// An expression list; skipped when every entry is empty.
 template <std::size_t N>
-bool WriteExpressions(VWriterNode& node, const std::string& name,
+bool WriteExpressions(VWriterNode& node, std::string_view name,
                       const std::array<std::string, N>& values,
                       const IVersion& lower = Versions::None,
                       const IVersion& upper = Versions::None) {
@@ -49,7 +50,7 @@ bool WriteExpressions(VWriterNode& node, const std::string& name,
 }
 
 /// A number list; skipped when empty.
-bool WriteNumbers(VWriterNode& node, const std::string& name, std::span<const double> values,
+bool WriteNumbers(VWriterNode& node, std::string_view name, std::span<const double> values,
                   const IVersion& lower = Versions::None, const IVersion& upper = Versions::None);
 
 /// Whether a direction is (0, 0, 0).

@@ -69,10 +69,8 @@ bool VStaticExpressionParser::Evaluate(const std::string& text, double& o_rValue
 
 bool VStaticExpressionParser::Evaluate(const std::string& text, double& o_rValue,
                                        std::string& o_rMessage) {
-  MathNodePtr node;
-  if (!Parse(m_Factory, text, node, o_rMessage, ',')) return false;
-  o_rValue = static_cast<const VMathNodeSimple&>(*node).m_Value;
-  return true;
+  // Only the value is wanted: evaluate without building the node tree and its texts.
+  return ParseValue(m_Factory, text, o_rValue, o_rMessage, ',');
 }
 
 bool VStaticExpressionParser::StaticValue(const std::string& name, double& o_rValue) const {

@@ -57,6 +57,18 @@ public:
   }
   void ClearConstants() override { m_Constants.clear(); }
 
+  /// The value a name stands for, as the simple factories' nodes take it: a variable's, else a
+  /// constant's first element (0 for an empty view). False when the name is neither.
+  bool FindValue(const std::string& name, double& o_rValue) const {
+    auto it = m_Variables.find(name);
+    if (it == m_Variables.end()) {
+      it = m_Constants.find(name);
+      if (it == m_Constants.end()) return false;
+    }
+    o_rValue = it->second.empty() ? 0.0 : it->second[0];
+    return true;
+  }
+
 private:
   std::map<std::string, std::span<const double>, std::less<>> m_Variables;
   std::map<std::string, std::span<const double>, std::less<>> m_Constants;

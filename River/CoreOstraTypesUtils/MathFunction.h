@@ -27,6 +27,8 @@ public:
   explicit VMathFunctionSimple(std::int32_t code) : m_Code(code) {}
   unsigned ArgumentCount() const override { return m_Code >= 0 && m_Code <= 2 ? 1u : 0u; }
   MathNodePtr Apply(const std::vector<MathNodePtr>& arguments) const override;
+  /// The function's value at `argument`; NaN for an unknown code.
+  static double Evaluate(std::int32_t code, double argument);
 
 private:
   std::int32_t m_Code;

@@ -3,6 +3,10 @@
 #include "River/CoreOstraTypesUtils/VMathFactorySimple.h"
 
 #include <cctype>
+#include <cmath>
+#include <cstdint>
+#include <cstdlib>
+#include <optional>
 #include <vector>
 
 namespace CoreOstraTypesUtils {
@@ -40,15 +44,86 @@ bool IsLetter(char c) {
   return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z');
 }
 
-class VParser {
+/// Builds nodes through a factory: the general road.
+class VNodeBuilder {
 public:
-  VParser(IMathFactory& factory, const std::string& text, char delimiter)
-      : m_rFactory(factory), m_rText(text), m_Delimiter(delimiter) {}
+  using Value = MathNodePtr;
+  using Function = MathFunctionPtr;
 
-  MathNodePtr ParseAll() {
+  explicit VNodeBuilder(IMathFactory& factory) : m_rFactory(factory) {}
+
+  static bool IsValid(const Value& value) { return value != nullptr; }
+  Value Plus(const Value& a, const Value& b) { return m_rFactory.Plus(a, b); }
+  Value Minus(const Value& a, const Value& b) { return m_rFactory.Plus(a, m_rFactory.Negate(b)); }
+  Value Multiply(const Value& a, const Value& b) { return m_rFactory.Multiply(a, b); }
+  Value Divide(const Value& a, const Value& b) {
+    return m_rFactory.Multiply(a, m_rFactory.Reciprocal(b));
+  }
+  Value Power(const Value& a, const Value& b) { return m_rFactory.Power(a, b); }
+  Value Negate(const Value& a) { return m_rFactory.Negate(a); }
+  Value Number(double value) { return m_rFactory.MakeNumber(value); }
+  /// A variable, else a constant; null when neither.
+  Value Name(const std::string& name) {
+    Value node = m_rFactory.FindVariable(name);
+    if (!node) node = m_rFactory.FindConstant(name);
+    return node;
+  }
+  Function MakeFunction(const std::string& name) { return m_rFactory.MakeFunction(name); }
+  static unsigned ArgumentCount(const Function& function) {
+    return function ? function->ArgumentCount() : 0;
+  }
+  Value Apply(const Function& function, const std::vector<Value>& arguments) {
+    return function->Apply(arguments);
+  }
+
+private:
+  IMathFactory& m_rFactory;
+};
+
+/// Computes values as it goes, with the arithmetic, names and functions of VMathFactorySimple:
+/// the value of a VMathNodeSimple without building one.
+class VValueBuilder {
+public:
+  using Value = std::optional<double>;
+  using Function = std::int32_t; ///< the VMathFunctionSimple code; -1 for none
+
+  explicit VValueBuilder(const VMathFactoryMaps& names) : m_rNames(names) {}
+
+  static bool IsValid(const Value& value) { return value.has_value(); }
+  Value Plus(const Value& a, const Value& b) { return *a + *b; }
+  Value Minus(const Value& a, const Value& b) { return *a + -*b; }
+  Value Multiply(const Value& a, const Value& b) { return *a * *b; }
+  Value Divide(const Value& a, const Value& b) { return *a * (1.0 / *b); }
+  Value Power(const Value& a, const Value& b) { return std::pow(*a, *b); }
+  Value Negate(const Value& a) { return -*a; }
+  Value Number(double value) { return value; }
+  Value Name(const std::string& name) {
+    double value = 0.0;
+    if (!m_rNames.FindValue(name, value)) return std::nullopt;
+    return value;
+  }
+  Function MakeFunction(const std::string& name) { return VMathFactorySimple::FunctionCode(name); }
+  static unsigned ArgumentCount(Function code) { return code >= 0 && code <= 2 ? 1u : 0u; }
+  Value Apply(Function code, const std::vector<Value>& arguments) {
+    return VMathFunctionSimple::Evaluate(code, *arguments[0]);
+  }
+
+private:
+  const VMathFactoryMaps& m_rNames;
+};
+
+/// The grammar, over either builder: both give the same messages for the same text.
+template <class TBuilder> class VParser {
+public:
+  using Value = typename TBuilder::Value;
+
+  VParser(TBuilder& builder, const std::string& text, char delimiter)
+      : m_rBuilder(builder), m_rText(text), m_Delimiter(delimiter) {}
+
+  Value ParseAll() {
     Next();
     if (m_Token.m_Code == ETokenEnd) Fail("Empty expression");
-    MathNodePtr result = Sum();
+    Value result = Sum();
     if (m_Token.m_Code != ETokenEnd) FailUnexpected();
     return result;
   }
@@ -59,9 +134,9 @@ private:
   }
   [[noreturn]] void FailUnexpected() const { Fail("Unexpected token \"" + m_Token.m_Text + "\""); }
 
-  MathNodePtr Checked(MathNodePtr node, const char* message) const {
-    if (!node) Fail(message);
-    return node;
+  Value Checked(Value value, const char* message) const {
+    if (!TBuilder::IsValid(value)) Fail(message);
+    return value;
   }
 
   void Next() {
@@ -155,67 +230,65 @@ private:
     m_Token.m_Text = std::move(name);
   }
 
-  MathNodePtr Sum() {
-    MathNodePtr left = Product();
+  Value Sum() {
+    Value left = Product();
     while (m_Token.m_Code == ETokenPlus || m_Token.m_Code == ETokenMinus) {
       const bool minus = m_Token.m_Code == ETokenMinus;
       Next();
-      MathNodePtr right = Product();
+      Value right = Product();
       if (minus) {
-        left = Checked(m_rFactory.Plus(left, m_rFactory.Negate(right)),
-                       "Minus operator invalid for arguments");
+        left = Checked(m_rBuilder.Minus(left, right), "Minus operator invalid for arguments");
       } else {
-        left = Checked(m_rFactory.Plus(left, right), "Plus operator invalid for arguments");
+        left = Checked(m_rBuilder.Plus(left, right), "Plus operator invalid for arguments");
       }
     }
     return left;
   }
 
-  MathNodePtr Product() {
-    MathNodePtr left = PowerTerm();
+  Value Product() {
+    Value left = PowerTerm();
     while (m_Token.m_Code == ETokenMultiply || m_Token.m_Code == ETokenDivide) {
       const bool divide = m_Token.m_Code == ETokenDivide;
       Next();
-      MathNodePtr right = PowerTerm();
+      Value right = PowerTerm();
       if (divide) {
-        left = Checked(m_rFactory.Multiply(left, m_rFactory.Reciprocal(right)),
-                       "Divide operator invalid for arguments");
+        left = Checked(m_rBuilder.Divide(left, right), "Divide operator invalid for arguments");
       } else {
-        left = Checked(m_rFactory.Multiply(left, right), "Multiply operator invalid for arguments");
+        left = Checked(m_rBuilder.Multiply(left, right), "Multiply operator invalid for arguments");
       }
     }
     return left;
   }
 
-  MathNodePtr PowerTerm() {
-    MathNodePtr left = SignedPrimary();
+  Value PowerTerm() {
+    Value left = SignedPrimary();
     while (m_Token.m_Code == ETokenPower) {
       Next();
-      MathNodePtr exponent = SignedPrimary();
-      left = Checked(m_rFactory.Power(left, exponent), "Power operator invalid for arguments");
+      Value exponent = SignedPrimary();
+      left = Checked(m_rBuilder.Power(left, exponent), "Power operator invalid for arguments");
     }
     return left;
   }
 
-  MathNodePtr SignedPrimary() {
+  Value SignedPrimary() {
     if (m_Token.m_Code == ETokenPlus) {
       Next();
       return Primary();
     }
     if (m_Token.m_Code == ETokenMinus) {
       Next();
-      return Checked(m_rFactory.Negate(Primary()), "Minus operator invalid for argument");
+      return Checked(m_rBuilder.Negate(Primary()), "Minus operator invalid for argument");
     }
     return Primary();
   }
 
-  MathNodePtr Primary() {
+  Value Primary() {
     switch (m_Token.m_Code) {
     case ETokenLeftParenthesis: {
       VDepthGuard guard(*this);
       Next();
       if (m_Token.m_Code == ETokenRightParenthesis) Fail("Missing argument");
-      MathNodePtr inner = Sum();
+      Value inner = Sum();
       if (m_Token.m_Code != ETokenRightParenthesis) Fail("Unbalanced parentheses");
       Next();
       return inner;
@@ -224,7 +297,7 @@ private:
       double value = 0.0;
       if (!ReadNumberText(m_Token.m_Text, value)) FailUnexpected();
       Next();
-      return m_rFactory.MakeNumber(value);
+      return m_rBuilder.Number(value);
     }
     case ETokenIdentifier: {
       const std::string name = m_Token.m_Text;
@@ -244,21 +317,22 @@ private:
     }
   }
 
-  MathNodePtr Name() {
-    const std::string name = m_Token.m_Text;
-    MathNodePtr node = m_rFactory.FindVariable(name);
-    if (!node) node = m_rFactory.FindConstant(name);
-    if (!node) Fail("ID \"" + name + "\" was referenced but never declared");
+  Value Name() {
+    Value node = m_rBuilder.Name(m_Token.m_Text);
+    if (!TBuilder::IsValid(node)) {
+      Fail("ID \"" + m_Token.m_Text + "\" was referenced but never declared");
+    }
     Next();
     return node;
   }
 
-  MathNodePtr Call(const std::string& name) {
+  Value Call(const std::string& name) {
     VDepthGuard guard(*this);
-    MathFunctionPtr function = m_rFactory.MakeFunction(name);
-    if (!function || function->ArgumentCount() == 0) Fail("Unknown function \"" + name + "\"");
+    const auto function = m_rBuilder.MakeFunction(name);
+    const unsigned argumentCount = TBuilder::ArgumentCount(function);
+    if (argumentCount == 0) Fail("Unknown function \"" + name + "\"");
     Next(); // past "("
-    std::vector<MathNodePtr> arguments;
+    std::vector<Value> arguments;
     if (m_Token.m_Code != ETokenRightParenthesis) {
       while (true) {
         if (m_Token.m_Code == ETokenEnd || m_Token.m_Code == ETokenRightParenthesis ||
@@ -274,13 +348,12 @@ private:
         break;
       }
     }
-    if (arguments.size() != function->ArgumentCount()) {
+    if (arguments.size() != argumentCount) {
       Fail("Cannot evaluate \"" + name + "\" for " + std::to_string(arguments.size()) +
-           " input arguments (" + std::to_string(function->ArgumentCount()) +
-           " arguments required)");
+           " input arguments (" + std::to_string(argumentCount) + " arguments required)");
     }
-    MathNodePtr result = function->Apply(arguments);
-    if (!result) Fail("Error in function \"" + name + "\"");
+    Value result = m_rBuilder.Apply(function, arguments);
+    if (!TBuilder::IsValid(result)) Fail("Error in function \"" + name + "\"");
     Next(); // past ")"
     return result;
   }
@@ -296,7 +369,7 @@ private:
   };
   static constexpr int MaxDepth = 256;
 
-  IMathFactory& m_rFactory;
+  TBuilder& m_rBuilder;
   const std::string& m_rText;
   int m_Depth = 0;
   char m_Delimiter;
@@ -310,17 +383,19 @@ VMathParseException::VMathParseException(const std::string& message, std::size_t
     : std::runtime_error("Parse Error at column " + std::to_string(column) + ": " + message),
       m_Message(message), m_Column(column) {}
 
-bool Parse(IMathFactory& factory, const std::string& text, MathNodePtr& o_rResult,
-           std::string& o_rMessage, char delimiter) {
-  o_rResult.reset();
+namespace {
+
+template <class TBuilder>
+bool ParseWith(TBuilder& builder, const std::string& text, typename TBuilder::Value& o_rResult,
+               std::string& o_rMessage, char delimiter) {
   if (delimiter == ' ') {
     o_rMessage = std::string("Invalid delimiting character '") + delimiter + "'";
     return false;
   }
   try {
-    VParser parser(factory, text, delimiter);
-    MathNodePtr result = parser.ParseAll();
-    if (!result) {
+    VParser<TBuilder> parser(builder, text, delimiter);
+    auto result = parser.ParseAll();
+    if (!TBuilder::IsValid(result)) {
       o_rMessage = VMathParseException("Unexpected token \"\"", text.size()).what();
       return false;
     }
@@ -331,6 +406,52 @@ bool Parse(IMathFactory& factory, const std::string& text, MathNodePtr& o_rResul
     o_rMessage = error.what();
     return false;
   }
+}
+
+/// A number alone, perhaps negated ("12", "-0.5"): the grammar reads it as ReadNumberText's value
+/// of the digits, negated. False for anything else.
+bool ReadPlainNumber(const std::string& text, double& o_rValue) {
+  const std::size_t start = !text.empty() && text[0] == '-' ? 1 : 0;
+  bool digit = false, point = false;
+  for (std::size_t i = start; i < text.size(); ++i) {
+    if (IsDigit(text[i])) {
+      digit = true;
+    } else if (text[i] == '.' && !point) {
+      point = true;
+    } else {
+      return false;
+    }
+  }
+  if (!digit) return false;
+  char* end = nullptr;
+  const double value = std::strtod(text.c_str() + start, &end);
+  if (end != text.c_str() + text.size()) return false;
+  o_rValue = start ? -value : value;
+  return true;
+}
+
+} // namespace
+
+bool Parse(IMathFactory& factory, const std::string& text, MathNodePtr& o_rResult,
+           std::string& o_rMessage, char delimiter) {
+  o_rResult.reset();
+  VNodeBuilder builder(factory);
+  return ParseWith(builder, text, o_rResult, o_rMessage, delimiter);
+}
+
+bool ParseValue(const VMathFactoryMaps& names, const std::string& text, double& o_rValue,
+                std::string& o_rMessage, char delimiter) {
+  // Most expressions of a file are plain numbers: no tokens, no grammar for them. A minus as the
+  // argument delimiter would make the sign a delimiter, so that case takes the grammar.
+  if (delimiter != ' ' && delimiter != '-' && ReadPlainNumber(text, o_rValue)) {
+    o_rMessage = "Parse Succeeded";
+    return true;
+  }
+  VValueBuilder builder(names);
+  std::optional<double> value;
+  if (!ParseWith(builder, text, value, o_rMessage, delimiter)) return false;
+  o_rValue = *value;
+  return true;
 }
 
 } // namespace CoreOstraTypesUtils

@@ -30,4 +30,10 @@ private:
 bool Parse(IMathFactory& factory, const std::string& text, MathNodePtr& o_rResult,
            std::string& o_rMessage, char delimiter = ',');
 
+/// As Parse through a VMathFactorySimple whose variables and constants are those of `names`,
+/// giving only the value, the same one, and the same messages. No node is built, so this is the
+/// road for evaluation alone.
+bool ParseValue(const VMathFactoryMaps& names, const std::string& text, double& o_rValue,
+                std::string& o_rMessage, char delimiter = ',');
+
 } // namespace CoreOstraTypesUtils

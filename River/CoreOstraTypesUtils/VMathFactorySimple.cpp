@@ -99,11 +99,15 @@ MathNodePtr VMathFactorySimple::MakeNumber(const std::string& text) {
   return std::make_shared<VMathNodeSimple>(text, value);
 }
 
+std::int32_t VMathFactorySimple::FunctionCode(const std::string& name) {
+  if (name == "sin" || name == "SIN") return 0;
+  if (name == "cos" || name == "COS") return 1;
+  if (name == "tan" || name == "TAN") return 2;
+  return -1;
+}
+
 MathFunctionPtr VMathFactorySimple::MakeFunction(const std::string& name) {
-  std::int32_t code = -1;
-  if (name == "sin" || name == "SIN") code = 0;
-  if (name == "cos" || name == "COS") code = 1;
-  if (name == "tan" || name == "TAN") code = 2;
+  const std::int32_t code = FunctionCode(name);
   if (code < 0) return nullptr;
   return std::make_shared<VMathFunctionSimple>(code);
 }
@@ -132,23 +136,25 @@ MathNodePtr VMathFactorySimpleLinear::MakeConstantNode(const std::string& name,
   return node;
 }
 
+double VMathFunctionSimple::Evaluate(std::int32_t code, double argument) {
+  switch (code) {
+  case 0:
+    return std::sin(argument);
+  case 1:
+    return std::cos(argument);
+  case 2:
+    return std::tan(argument);
+  default:
+    return std::numeric_limits<double>::quiet_NaN();
+  }
+}
+
 MathNodePtr VMathFunctionSimple::Apply(const std::vector<MathNodePtr>& arguments) const {
   if (arguments.size() != 1) return nullptr;
   const auto* x = dynamic_cast<const VMathNodeSimple*>(arguments[0].get());
   if (!x) return nullptr;
   static const char* const prefixes[] = {"sin( ", "cos( ", "tan( "};
-  double value = std::numeric_limits<double>::quiet_NaN();
-  switch (m_Code) {
-  case 0:
-    value = std::sin(x->m_Value);
-    break;
-  case 1:
-    value = std::cos(x->m_Value);
-    break;
-  case 2:
-    value = std::tan(x->m_Value);
-    break;
-  }
+  const double value = Evaluate(m_Code, x->m_Value);
   const char* prefix = ArgumentCount() == 1 ? prefixes[m_Code] : "fn( ";
   auto node = std::make_shared<VMathNodeSimple>(prefix + x->m_Text + " )", value);
   node->m_Parameters = x->m_Parameters;

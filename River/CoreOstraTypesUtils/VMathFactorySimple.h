@@ -21,6 +21,8 @@ public:
   MathNodePtr MakeNumber(const std::string& text) override;
   /// "sin"/"SIN", "cos"/"COS", "tan"/"TAN".
   MathFunctionPtr MakeFunction(const std::string& name) override;
+  /// The VMathFunctionSimple code of a function name; -1 for an unknown one.
+  static std::int32_t FunctionCode(const std::string& name);
   /// The name as text and the first element as value (0 for an empty view).
   MathNodePtr MakeVariableNode(const std::string& name, std::span<const double> values) override;
   MathNodePtr MakeConstantNode(const std::string& name, std::span<const double> values) override;

@@ -3,6 +3,7 @@
 #include <cctype>
 #include <charconv>
 #include <cmath>
+#include <cstdint>
 #include <cstdio>
 #include <limits>
 
@@ -40,12 +41,48 @@ private:
   bool m_Escaped = false;
 };
 
+/// Whether `text` starts as a plain decimal number does: an optional minus, then a digit or a
+/// point.
+bool StartsPlainNumber(std::string_view text) {
+  if (!text.empty() && text.front() == '-') text.remove_prefix(1);
+  return !text.empty() && ((text.front() >= '0' && text.front() <= '9') || text.front() == '.');
+}
+
 struct VSpecialDouble {
   std::string_view m_Text;
   double m_Value;
 };
 
 } // namespace
+
+// The digits form an integer held exactly, and one division by an exact power of ten rounds
+// correctly: the result is the one strtod gives.
+bool ParseShortDecimal(std::string_view text, double& o_rValue) {
+  static constexpr double powersOfTen[] = {1e0, 1e1, 1e2,  1e3,  1e4,  1e5,  1e6,  1e7,
+                                           1e8, 1e9, 1e10, 1e11, 1e12, 1e13, 1e14, 1e15};
+  const char* p = text.data();
+  const char* const end = p + text.size();
+  const bool negative = p < end && *p == '-';
+  if (negative) ++p;
+  std::uint64_t mantissa = 0;
+  int digits = 0, fractionDigits = 0;
+  bool point = false;
+  for (; p < end; ++p) {
+    if (*p >= '0' && *p <= '9') {
+      if (++digits > 15) return false;
+      mantissa = mantissa * 10 + static_cast<std::uint64_t>(*p - '0');
+      if (point) ++fractionDigits;
+    } else if (*p == '.' && !point) {
+      point = true;
+    } else {
+      return false;
+    }
+  }
+  if (digits == 0) return false;
+  const double value = static_cast<double>(mantissa) / powersOfTen[fractionDigits];
+  o_rValue = negative ? -value : value;
+  return true;
+}
 
 std::string_view TrimBlanks(std::string_view text) {
   while (!text.empty() && IsBlank(text.front()))
@@ -70,11 +107,26 @@ std::vector<std::string_view> SplitBlanks(std::string_view text) {
 }
 
 bool ParseDouble(std::string_view text, double& o_rValue) {
-  const std::string trimmed(TrimBlanks(text));
+  const std::string_view trimmed = TrimBlanks(text);
+  // Plain decimal numbers, nearly every value of a file, convert without a copy: on them
+  // from_chars and the scanf conversion below agree to the bit (both round correctly). Anything
+  // else (a sign other than minus, hexadecimal, inf, nan, a value out of range) takes the scanf
+  // road so that it reads exactly as it always has.
+  if (ParseShortDecimal(trimmed, o_rValue)) return true;
+  if (StartsPlainNumber(trimmed)) {
+    double value = 0.0;
+    const char* last = trimmed.data() + trimmed.size();
+    const auto [end, error] = std::from_chars(trimmed.data(), last, value);
+    if (error == std::errc() && end == last) {
+      o_rValue = value;
+      return true;
+    }
+  }
+  const std::string copy(trimmed);
   double value = 0.0;
   int consumed = 0;
-  if (!trimmed.empty() && std::sscanf(trimmed.c_str(), "%lf%n", &value, &consumed) == 1 &&
-      consumed == static_cast<int>(trimmed.size())) {
+  if (!copy.empty() && std::sscanf(copy.c_str(), "%lf%n", &value, &consumed) == 1 &&
+      consumed == static_cast<int>(copy.size())) {
     o_rValue = value;
     return true;
   }
@@ -94,10 +146,31 @@ bool ParseDouble(std::string_view text, double& o_rValue) {
 }
 
 std::string FormatDouble(double value) {
-  if (value == 0.0) return "0"; // never "-0": a sign on zero is an artefact of arithmetic
   char buffer[40];
-  const int n = std::snprintf(buffer, sizeof buffer, "%.17g", value);
-  return n > 0 ? std::string(buffer, static_cast<std::size_t>(n)) : std::string();
+  return std::string(FormatDouble(value, buffer));
+}
+
+void AppendDouble(std::string& io_rText, double value) {
+  char buffer[40];
+  io_rText += FormatDouble(value, buffer);
+}
+
+std::string_view FormatDouble(double value, char (&buffer)[40]) {
+  if (value == 0.0) return "0"; // never "-0": a sign on zero is an artefact of arithmetic
+  // An integer below 10^15 prints under "%.17g" as its digits alone: write them directly.
+  if (value > -1e15 && value < 1e15) {
+    const auto whole = static_cast<std::int64_t>(value);
+    if (static_cast<double>(whole) == value) {
+      const auto [end, error] = std::to_chars(buffer, buffer + 40, whole);
+      return {buffer, static_cast<std::size_t>(end - buffer)};
+    }
+  }
+  // to_chars with a precision is specified as printf's "%.17g" in the C locale, inf and nan
+  // spellings included, and needs neither the locale nor a format string.
+  const auto [end, error] =
+      std::to_chars(buffer, buffer + 40, value, std::chars_format::general, 17);
+  if (error != std::errc()) return {};
+  return {buffer, static_cast<std::size_t>(end - buffer)};
 }
 
 bool ParseBool(std::string_view text, bool& o_rValue) {

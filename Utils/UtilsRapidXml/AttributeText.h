@@ -21,9 +21,18 @@ std::vector<std::string_view> SplitBlanks(std::string_view text);
 /// (negative quiet NaN).
 bool ParseDouble(std::string_view text, double& o_rValue);
 
+/// As ParseDouble for the short plain decimals that fill most files ("0", "-20", "0.01": at
+/// most 15 digits, no exponent), exactly, without the general conversion. False, with
+/// `o_rValue` untouched, for any other text.
+bool ParseShortDecimal(std::string_view text, double& o_rValue);
+
 /// "%.17g": round-trips every double; non-finite values print as inf, -inf, nan, -nan. Zero
 /// prints as "0" whatever its sign.
 std::string FormatDouble(double value);
+/// Appends FormatDouble's text of `value` to `io_rText`.
+void AppendDouble(std::string& io_rText, double value);
+/// FormatDouble's text of `value` in `buffer`.
+std::string_view FormatDouble(double value, char (&buffer)[40]);
 
 /// Trimmed "0" / "1", else case-insensitive "true" / "false".
 bool ParseBool(std::string_view text, bool& o_rValue);

@@ -2,6 +2,7 @@
 
 #include <map>
 #include <string>
+#include <string_view>
 #include <utility>
 #include <vector>
 
@@ -27,6 +28,8 @@ public:
   }
 
   std::string Name() const override { return m_Name; }
+  /// Name without a copy.
+  const std::string& TypeName() const { return m_Name; }
   std::vector<std::string> Names() const override {
     std::vector<std::string> names;
     names.reserve(m_ToValue.size());
@@ -36,7 +39,7 @@ public:
   }
 
   /// Looks a keyword up; false when it is unknown.
-  bool ToValue(const std::string& keyword, T& o_rValue) const {
+  bool ToValue(std::string_view keyword, T& o_rValue) const {
     auto it = m_ToValue.find(keyword);
     if (it == m_ToValue.end()) return false;
     o_rValue = it->second;
@@ -52,7 +55,7 @@ public:
 
 private:
   std::string m_Name;
-  std::map<std::string, T> m_ToValue;
+  std::map<std::string, T, std::less<>> m_ToValue;
   std::map<T, std::string> m_ToKeyword;
 };
 

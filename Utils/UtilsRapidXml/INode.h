@@ -10,6 +10,7 @@
 #include <cstdint>
 #include <functional>
 #include <string>
+#include <string_view>
 
 namespace UtilsRapidXml {
 
@@ -30,9 +31,8 @@ public:
 
   /// Declares one child element. Declarations collect until Children. A negative `maxOccurs`
   /// means unbounded; limits are inclusive and an invalid one is open.
-  virtual void Child(const std::string& name, const std::string& documentation,
-                     std::int32_t minOccurs, std::int32_t maxOccurs,
-                     const IVersion& lower = IVersion::None(),
+  virtual void Child(std::string_view name, std::string_view documentation, std::int32_t minOccurs,
+                     std::int32_t maxOccurs, const IVersion& lower = IVersion::None(),
                      const IVersion& upper = IVersion::None()) = 0;
   /// Processes the children declared since the last call, running `handler` on each. With
   /// `choice`, exactly one of the declared names may appear.
@@ -40,10 +40,16 @@ public:
 
   /// Declares one attribute and reads it into `o_rValue`. Returns true only when a value was
   /// read; otherwise `o_rValue` is left alone so the caller's default stands.
-  virtual bool Attribute(const std::string& name, std::string& o_rValue,
-                         const std::string& documentation, const std::string& type, bool required,
+  virtual bool Attribute(std::string_view name, std::string& o_rValue,
+                         std::string_view documentation, std::string_view type, bool required,
                          const IVersion& lower = IVersion::None(),
                          const IVersion& upper = IVersion::None()) = 0;
+  /// As Attribute, with the value as a view of the document's text: no copy. The view stays valid
+  /// as long as the parsed document does.
+  virtual bool AttributeText(std::string_view name, std::string_view& o_rValue,
+                             std::string_view documentation, std::string_view type, bool required,
+                             const IVersion& lower = IVersion::None(),
+                             const IVersion& upper = IVersion::None()) = 0;
 
   virtual void Error(const std::string& message) = 0;
   virtual void Warning(const std::string& message) = 0;

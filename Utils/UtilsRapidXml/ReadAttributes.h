@@ -12,6 +12,7 @@
 #include <cstdint>
 #include <limits>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace UtilsRapidXml {
@@ -23,73 +24,73 @@ inline constexpr std::size_t AnyCount = std::numeric_limits<std::size_t>::max();
 
 using ColourBytes = std::array<std::uint8_t, 4>;
 
-void ReportUninterpretable(INode& node, const std::string& name);
+void ReportUninterpretable(INode& node, std::string_view name);
 
-bool ReadString(INode& node, const std::string& name, std::string& o_rValue,
-                const std::string& documentation, const std::string& type, bool required,
+bool ReadString(INode& node, std::string_view name, std::string& o_rValue,
+                std::string_view documentation, std::string_view type, bool required,
                 const IVersion& lower = IVersion::None(), const IVersion& upper = IVersion::None());
 
-bool ReadDouble(INode& node, const std::string& name, double& o_rValue,
-                const std::string& documentation, const std::string& type, bool required,
+bool ReadDouble(INode& node, std::string_view name, double& o_rValue,
+                std::string_view documentation, std::string_view type, bool required,
                 const IVersion& lower = IVersion::None(), const IVersion& upper = IVersion::None());
 
 /// As ReadDouble; "*" or "?" store UnsetDouble.
-bool ReadOptionalDouble(INode& node, const std::string& name, double& o_rRawValue,
-                        const std::string& documentation, const std::string& type, bool required,
+bool ReadOptionalDouble(INode& node, std::string_view name, double& o_rRawValue,
+                        std::string_view documentation, std::string_view type, bool required,
                         const IVersion& lower = IVersion::None(),
                         const IVersion& upper = IVersion::None());
 
-bool ReadBool(INode& node, const std::string& name, bool& o_rValue,
-              const std::string& documentation, const std::string& type, bool required,
-              const IVersion& lower = IVersion::None(), const IVersion& upper = IVersion::None());
+bool ReadBool(INode& node, std::string_view name, bool& o_rValue, std::string_view documentation,
+              std::string_view type, bool required, const IVersion& lower = IVersion::None(),
+              const IVersion& upper = IVersion::None());
 
-bool ReadUnsigned(INode& node, const std::string& name, std::uint32_t& o_rValue,
-                  const std::string& documentation, const std::string& type, bool required,
+bool ReadUnsigned(INode& node, std::string_view name, std::uint32_t& o_rValue,
+                  std::string_view documentation, std::string_view type, bool required,
                   const IVersion& lower = IVersion::None(),
                   const IVersion& upper = IVersion::None());
 
-bool ReadVersion(INode& node, const std::string& name, IVersion& o_rValue,
-                 const std::string& documentation, const std::string& type, bool required,
+bool ReadVersion(INode& node, std::string_view name, IVersion& o_rValue,
+                 std::string_view documentation, std::string_view type, bool required,
                  const IVersion& lower = IVersion::None(),
                  const IVersion& upper = IVersion::None());
 
 /// Three numbers, each clamped to 0..255; alpha is set to 255.
-bool ReadColour(INode& node, const std::string& name, ColourBytes& o_rValue,
-                const std::string& documentation, const std::string& type, bool required,
+bool ReadColour(INode& node, std::string_view name, ColourBytes& o_rValue,
+                std::string_view documentation, std::string_view type, bool required,
                 const IVersion& lower = IVersion::None(), const IVersion& upper = IVersion::None());
 
 /// Exactly `count` numbers (any number for AnyCount), stored from `offset` on; the vector grows
 /// as needed and never shrinks. A wrong count is the error "<node> node's <name> attribute had
 /// incorrect number of components".
-bool ReadDoubleList(INode& node, const std::string& name, std::vector<double>& io_rValues,
-                    std::size_t count, std::size_t offset, const std::string& documentation,
-                    const std::string& type, bool required,
-                    const IVersion& lower = IVersion::None(),
+bool ReadDoubleList(INode& node, std::string_view name, std::vector<double>& io_rValues,
+                    std::size_t count, std::size_t offset, std::string_view documentation,
+                    std::string_view type, bool required, const IVersion& lower = IVersion::None(),
                     const IVersion& upper = IVersion::None());
 
 /// As ReadDoubleList with "*" or "?" for unset entries.
-bool ReadOptionalDoubleList(INode& node, const std::string& name, std::vector<double>& io_rValues,
-                            std::size_t count, std::size_t offset, const std::string& documentation,
-                            const std::string& type, bool required,
+bool ReadOptionalDoubleList(INode& node, std::string_view name, std::vector<double>& io_rValues,
+                            std::size_t count, std::size_t offset, std::string_view documentation,
+                            std::string_view type, bool required,
                             const IVersion& lower = IVersion::None(),
                             const IVersion& upper = IVersion::None());
 
 /// Exactly `count` expressions (any number for AnyCount), split so that single-quoted names may
 /// hold blanks, stored from `offset` on.
-bool ReadExpressionList(INode& node, const std::string& name, std::vector<std::string>& io_rValues,
-                        std::size_t count, std::size_t offset, const std::string& documentation,
-                        const std::string& type, bool required,
+bool ReadExpressionList(INode& node, std::string_view name, std::vector<std::string>& io_rValues,
+                        std::size_t count, std::size_t offset, std::string_view documentation,
+                        std::string_view type, bool required,
                         const IVersion& lower = IVersion::None(),
                         const IVersion& upper = IVersion::None());
 
 /// Declares the enumeration, then reads one of its keywords.
 template <class T>
-bool ReadEnum(INode& node, const std::string& name, T& o_rValue, const VEnum<T>& enumeration,
-              const std::string& documentation, bool required,
+bool ReadEnum(INode& node, std::string_view name, T& o_rValue, const VEnum<T>& enumeration,
+              std::string_view documentation, bool required,
               const IVersion& lower = IVersion::None(), const IVersion& upper = IVersion::None()) {
   node.Enum(enumeration);
-  std::string text;
-  if (!node.Attribute(name, text, documentation, enumeration.Name(), required, lower, upper)) {
+  std::string_view text;
+  if (!node.AttributeText(name, text, documentation, enumeration.TypeName(), required, lower,
+                          upper)) {
     return false;
   }
   if (!enumeration.ToValue(text, o_rValue)) {

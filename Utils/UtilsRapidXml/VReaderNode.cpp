@@ -7,6 +7,21 @@
 
 namespace UtilsRapidXml {
 
+namespace {
+
+std::uint32_t NameKey(std::string_view name) {
+  if (name.empty()) return 0;
+  return static_cast<std::uint32_t>(name.size() << 16) ^
+         (static_cast<std::uint32_t>(static_cast<unsigned char>(name.front())) << 8) ^
+         static_cast<unsigned char>(name.back());
+}
+
+std::uint64_t KeyBit(std::uint32_t key) {
+  return std::uint64_t{1} << ((key * 0x9E3779B1u) >> 26);
+}
+
+} // namespace
+
 VReaderNode::VReaderNode(rapidxml::xml_document<>& document, bool strictSequence)
     : m_pNode(&document), m_pInfo(std::make_shared<VGlobalInfo>()) {
   m_pInfo->m_StrictSequence = strictSequence;
@@ -17,6 +32,9 @@ VReaderNode::VReaderNode(rapidxml::xml_node<>* node, std::shared_ptr<VGlobalInfo
     : m_pNode(node), m_pInfo(std::move(info)),
       m_Path(parentPath + "/" + std::string(NodeName(node))) {}
 
+VReaderNode::VReaderNode(rapidxml::xml_node<>* node, const VReaderNode& parent)
+    : m_pNode(node), m_pInfo(parent.m_pInfo), m_pParent(&parent) {}
+
 VReaderNode::~VReaderNode() {
   try {
     ReportUnvisited();
@@ -25,19 +43,33 @@ VReaderNode::~VReaderNode() {
   }
 }
 
+const std::string& VReaderNode::Path() const {
+  // A child node lives inside its parent's Children call, so the parent is still there.
+  if (m_pParent) {
+    const std::string& parentPath = m_pParent->Path();
+    const std::string_view name = NodeName(m_pNode);
+    m_Path.reserve(parentPath.size() + 1 + name.size());
+    m_Path.append(parentPath).append(1, '/').append(name);
+    m_pParent = nullptr;
+  }
+  return m_Path;
+}
+
 void VReaderNode::ReportUnvisited() {
   if (m_Abandoned) return;
+  std::size_t index = 0;
   for (auto* attribute = m_pNode->first_attribute(); attribute;
-       attribute = attribute->next_attribute()) {
-    const std::string key = m_Path + "/" + std::string(NodeName(attribute));
-    if (!m_VisitedAttributes.count(key)) {
+       attribute = attribute->next_attribute(), ++index) {
+    if (!m_VisitedAttributes.Test(index)) {
+      const std::string key = Path() + "/" + std::string(NodeName(attribute));
       Warning(ZMT::FormatOrRaw("Ignoring unrecognised attribute: %1%", key));
     }
   }
-  for (auto* child = m_pNode->first_node(); child; child = child->next_sibling()) {
+  index = 0;
+  for (auto* child = m_pNode->first_node(); child; child = child->next_sibling(), ++index) {
     if (child->type() != rapidxml::node_element) continue;
-    const std::string key = m_Path + "/" + std::string(NodeName(child));
-    if (!m_VisitedElements.count(key)) {
+    if (!m_VisitedElements.Test(index)) {
+      const std::string key = Path() + "/" + std::string(NodeName(child));
       Warning(ZMT::FormatOrRaw("Ignoring unrecognised element type: %1%", key));
     }
   }
@@ -47,51 +79,84 @@ std::string VReaderNode::Name() const {
   return std::string(NodeName(m_pNode));
 }
 
-bool VReaderNode::Attribute(const std::string& name, std::string& o_rValue, const std::string&,
-                            const std::string& type, bool required, const IVersion& lower,
-                            const IVersion& upper) {
-  m_VisitedAttributes.insert(m_Path + "/" + name);
-  auto* attribute = m_pNode->first_attribute(name.c_str(), name.size());
+bool VReaderNode::Attribute(std::string_view name, std::string& o_rValue,
+                            std::string_view documentation, std::string_view type, bool required,
+                            const IVersion& lower, const IVersion& upper) {
+  std::string_view value;
+  if (!AttributeText(name, value, documentation, type, required, lower, upper)) return false;
+  o_rValue.assign(value);
+  return true;
+}
+
+bool VReaderNode::AttributeText(std::string_view name, std::string_view& o_rValue, std::string_view,
+                                std::string_view type, bool required, const IVersion& lower,
+                                const IVersion& upper) {
+  // Declaring a name visits every attribute of that name; the first one is the value.
+  if (!m_AttributesListed) ListAttributes();
+  rapidxml::xml_attribute<>* attribute = nullptr;
+  const std::uint32_t key = NameKey(name);
+  if (m_KeyBits & KeyBit(key)) {
+    for (std::size_t index = 0; index < m_Attributes.size(); ++index) {
+      const auto& listed = m_Attributes[index];
+      if (listed.m_Key != key || NodeName(listed.m_pAttribute) != name) continue;
+      m_VisitedAttributes.Set(index);
+      if (!attribute) attribute = listed.m_pAttribute;
+      if (!m_KeysCollide) break; // no other attribute can bear this name
+    }
+  }
   if (IsOutOfRange(m_pInfo->m_Version, lower, upper)) {
     if (attribute) {
       Warning(ZMT::FormatOrRaw(
-          "Ignoring %1% attribute in %2% element. Not supported in files with version %3%", name,
-          Name(), m_pInfo->m_Version.ToString()));
+          "Ignoring %1% attribute in %2% element. Not supported in files with version %3%",
+          std::string(name), Name(), m_pInfo->m_Version.ToString()));
     }
     return false;
   }
   if (!attribute) {
     if (required) {
-      Error(ZMT::FormatOrRaw("%1% element missing required attribute %2%", Name(), name));
+      Error(ZMT::FormatOrRaw("%1% element missing required attribute %2%", Name(),
+                             std::string(name)));
     }
     return false;
   }
-  o_rValue.assign(NodeValue(attribute));
+  const std::string_view value = NodeValue(attribute);
   if (type == "xsd:ID") {
-    if (!m_pInfo->m_Ids.insert(o_rValue).second) {
-      Warning(ZMT::FormatOrRaw("File contains duplicate ID : %1% ", o_rValue));
+    if (!m_pInfo->m_Ids.emplace(value).second) {
+      Warning(ZMT::FormatOrRaw("File contains duplicate ID : %1% ", std::string(value)));
     }
   } else if (type == "xsd:IDREF") {
-    if (!m_pInfo->m_Ids.count(o_rValue)) {
-      Warning(ZMT::FormatOrRaw("File contains unknown IDREF : %1% ", o_rValue));
+    if (m_pInfo->m_Ids.find(value) == m_pInfo->m_Ids.end()) {
+      Warning(ZMT::FormatOrRaw("File contains unknown IDREF : %1% ", std::string(value)));
     }
   }
+  o_rValue = value;
   return true;
 }
 
-void VReaderNode::Child(const std::string& name, const std::string&, std::int32_t minOccurs,
+void VReaderNode::ListAttributes() {
+  for (auto* attribute = m_pNode->first_attribute(); attribute;
+       attribute = attribute->next_attribute()) {
+    const std::uint32_t key = NameKey(NodeName(attribute));
+    const std::uint64_t bit = KeyBit(key);
+    m_KeysCollide = m_KeysCollide || (m_KeyBits & bit) != 0;
+    m_KeyBits |= bit;
+    m_Attributes.push_back({key, attribute});
+  }
+  m_AttributesListed = true;
+}
+
+void VReaderNode::Child(std::string_view name, std::string_view, std::int32_t minOccurs,
                         std::int32_t maxOccurs, const IVersion& lower, const IVersion& upper) {
-  m_Declarations.push_back({name, minOccurs, maxOccurs, lower, upper});
+  m_Declarations.push_back({std::string(name), minOccurs, maxOccurs, lower, upper});
 }
 
 void VReaderNode::MatchDeclaration(const VDeclaration& declaration, bool choice,
-                                   std::string& io_rChoiceName,
-                                   std::vector<VAccepted>& io_rAccepted) {
-  m_VisitedElements.insert(m_Path + "/" + declaration.m_Name);
+                                   std::string& io_rChoiceName, VAcceptedList& io_rAccepted) {
   std::int64_t count = 0;
   std::size_t position = 0;
   for (auto* child = m_pNode->first_node(); child; child = child->next_sibling(), ++position) {
     if (child->type() != rapidxml::node_element || NodeName(child) != declaration.m_Name) continue;
+    m_VisitedElements.Set(position);
     if (IsOutOfRange(m_pInfo->m_Version, declaration.m_Lower, declaration.m_Upper)) {
       Warning(ZMT::FormatOrRaw("Ignoring %1% element. Not supported in files with version %2%",
                                declaration.m_Name, m_pInfo->m_Version.ToString()));
@@ -106,13 +171,13 @@ void VReaderNode::MatchDeclaration(const VDeclaration& declaration, bool choice,
     if (!choice) {
       ++count;
       if (declaration.m_MaxOccurs >= 1 && count > declaration.m_MaxOccurs) {
-        Error(ZMT::FormatOrRaw("%1% element must have a maximum of %2% %3% child elements", m_Path,
+        Error(ZMT::FormatOrRaw("%1% element must have a maximum of %2% %3% child elements", Path(),
                                declaration.m_MaxOccurs, declaration.m_Name));
         continue;
       }
     } else {
       if (!io_rChoiceName.empty() && io_rChoiceName != declaration.m_Name) {
-        Error(ZMT::FormatOrRaw("%1% element cannot have both a %2% and a %3% child element", m_Path,
+        Error(ZMT::FormatOrRaw("%1% element cannot have both a %2% and a %3% child element", Path(),
                                io_rChoiceName, declaration.m_Name));
         continue;
       }
@@ -121,7 +186,7 @@ void VReaderNode::MatchDeclaration(const VDeclaration& declaration, bool choice,
     io_rAccepted.push_back({position, child});
   }
   if (!choice && count < declaration.m_MinOccurs) {
-    Error(ZMT::FormatOrRaw("%1% element must have a minimum of %2% %3% child elements", m_Path,
+    Error(ZMT::FormatOrRaw("%1% element must have a minimum of %2% %3% child elements", Path(),
                            declaration.m_MinOccurs, declaration.m_Name));
   }
 }
@@ -129,26 +194,29 @@ void VReaderNode::MatchDeclaration(const VDeclaration& declaration, bool choice,
 void VReaderNode::Children(Handler handler, bool choice) {
   if (m_Declarations.empty()) return;
   // Take the declarations now: a handler may declare on this node again.
-  std::vector<VDeclaration> declarations;
+  VDeclarations declarations;
   declarations.swap(m_Declarations);
 
-  std::vector<VAccepted> accepted;
+  VAcceptedList accepted;
   std::string choiceName;
   for (const auto& declaration : declarations) {
     MatchDeclaration(declaration, choice, choiceName, accepted);
   }
   if (choice && accepted.empty()) {
     std::string message =
-        ZMT::FormatOrRaw("%1% element must have a one of the following child elements:", m_Path);
+        ZMT::FormatOrRaw("%1% element must have a one of the following child elements:", Path());
     for (const auto& declaration : declarations)
       message += " " + declaration.m_Name;
     Error(message);
   }
-  std::stable_sort(accepted.begin(), accepted.end(), [](const VAccepted& a, const VAccepted& b) {
-    return a.m_Position < b.m_Position;
-  });
+  // One declaration's children come in document order already; only several need the sort.
+  if (declarations.size() > 1) {
+    std::stable_sort(accepted.begin(), accepted.end(), [](const VAccepted& a, const VAccepted& b) {
+      return a.m_Position < b.m_Position;
+    });
+  }
   for (const auto& child : accepted) {
-    VReaderNode node(child.m_pNode, m_pInfo, m_Path);
+    VReaderNode node(child.m_pNode, *this);
     if (handler) handler(node);
   }
 }

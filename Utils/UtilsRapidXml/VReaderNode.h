@@ -4,15 +4,26 @@
 // declarations. Problems are collected, never thrown: the walk always goes to the end.
 
 #include "Utils/UtilsRapidXml/INode.h"
+#include "Utils/UtilsRapidXml/VVisitMarks.h"
 
+#include <boost/container/small_vector.hpp>
 #include <rapidxml/rapidxml.hpp>
 
 #include <memory>
-#include <set>
 #include <string>
+#include <string_view>
+#include <unordered_set>
 #include <vector>
 
 namespace UtilsRapidXml {
+
+/// Hash of strings that also takes views, for lookups without a copy.
+struct VStringHash {
+  using is_transparent = void;
+  std::size_t operator()(std::string_view text) const {
+    return std::hash<std::string_view>{}(text);
+  }
+};
 
 class VReaderNode final : public INode {
 public:
@@ -22,7 +33,8 @@ public:
     std::vector<std::string> m_Errors;
     std::vector<std::string> m_Warnings;
     bool m_StrictSequence = false; ///< children must follow declaration order
-    std::set<std::string> m_Ids;   ///< values of "xsd:ID" attributes read so far
+    /// Values of "xsd:ID" attributes read so far; only ever asked whether it holds a value.
+    std::unordered_set<std::string, VStringHash, std::equal_to<>> m_Ids;
   };
 
   /// Root node over a parsed document, with fresh global information.
@@ -39,19 +51,24 @@ public:
 
   /// The global information; keep it to read the warnings the destructors add.
   std::shared_ptr<VGlobalInfo> Info() const { return m_pInfo; }
-  const std::string& Path() const { return m_Path; }
+  /// "/KinematicModel/Skeleton/Segment": built on first use, since only messages need it.
+  const std::string& Path() const;
 
   std::string Name() const override;
   void SetVersion(const IVersion& version) override { m_pInfo->m_Version = version; }
   IVersion Version() const override { return m_pInfo->m_Version; }
   void Enum(const IEnum&) override {}
-  void Child(const std::string& name, const std::string& documentation, std::int32_t minOccurs,
+  void Child(std::string_view name, std::string_view documentation, std::int32_t minOccurs,
              std::int32_t maxOccurs, const IVersion& lower = IVersion::None(),
              const IVersion& upper = IVersion::None()) override;
   void Children(Handler handler, bool choice = false) override;
-  bool Attribute(const std::string& name, std::string& o_rValue, const std::string& documentation,
-                 const std::string& type, bool required, const IVersion& lower = IVersion::None(),
+  bool Attribute(std::string_view name, std::string& o_rValue, std::string_view documentation,
+                 std::string_view type, bool required, const IVersion& lower = IVersion::None(),
                  const IVersion& upper = IVersion::None()) override;
+  bool AttributeText(std::string_view name, std::string_view& o_rValue,
+                     std::string_view documentation, std::string_view type, bool required,
+                     const IVersion& lower = IVersion::None(),
+                     const IVersion& upper = IVersion::None()) override;
   void Error(const std::string& message) override { m_pInfo->m_Errors.push_back(message); }
   void Warning(const std::string& message) override { m_pInfo->m_Warnings.push_back(message); }
   std::uint64_t ErrorCount() const override { return m_pInfo->m_Errors.size(); }
@@ -69,18 +86,39 @@ private:
     std::size_t m_Position;
     rapidxml::xml_node<>* m_pNode;
   };
+  // Most elements declare and hold a handful of children: keep those off the heap.
+  using VDeclarations = boost::container::small_vector<VDeclaration, 4>;
+  using VAcceptedList = boost::container::small_vector<VAccepted, 8>;
+
+  /// Node for a child element met by Children; its path comes from `parent` when asked for.
+  VReaderNode(rapidxml::xml_node<>* node, const VReaderNode& parent);
 
   /// Applies one declaration to the XML children; accepted ones are appended to `io_rAccepted`.
   void MatchDeclaration(const VDeclaration& declaration, bool choice, std::string& io_rChoiceName,
-                        std::vector<VAccepted>& io_rAccepted);
+                        VAcceptedList& io_rAccepted);
   void ReportUnvisited();
+  /// Fills m_Attributes on first use.
+  void ListAttributes();
 
   rapidxml::xml_node<>* m_pNode;
   std::shared_ptr<VGlobalInfo> m_pInfo;
-  std::string m_Path;
-  std::set<std::string> m_VisitedAttributes;
-  std::set<std::string> m_VisitedElements;
-  std::vector<VDeclaration> m_Declarations;
+  mutable const VReaderNode* m_pParent = nullptr; ///< set while the path is still to be built
+  mutable std::string m_Path;
+  // What the declaration visited, by position among the element's XML attributes and child
+  // nodes. A name declared once covers every attribute or child of that name.
+  VVisitMarks m_VisitedAttributes;
+  // The element's attributes with a short key of each name (length and two characters), so that
+  // looking a declared name up compares whole names only where the keys agree.
+  struct VListedAttribute {
+    std::uint32_t m_Key;
+    rapidxml::xml_attribute<>* m_pAttribute;
+  };
+  boost::container::small_vector<VListedAttribute, 16> m_Attributes;
+  std::uint64_t m_KeyBits = 0; ///< one bit per key present, to pass over absent names at once
+  bool m_KeysCollide = false;  ///< two attributes share a key bit: names may repeat
+  bool m_AttributesListed = false;
+  VVisitMarks m_VisitedElements;
+  VDeclarations m_Declarations;
   std::size_t m_LastPosition = 0; ///< position of the last accepted child, for strict order
   bool m_Abandoned = false;
 };

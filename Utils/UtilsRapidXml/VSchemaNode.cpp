@@ -56,7 +56,7 @@ VSchemaNode::~VSchemaNode() {
     m_pComplexType->append_node(attribute);
 }
 
-void VSchemaNode::AppendAnnotation(rapidxml::xml_node<>* parent, const std::string& documentation,
+void VSchemaNode::AppendAnnotation(rapidxml::xml_node<>* parent, std::string_view documentation,
                                    const IVersion& lower, const IVersion& upper) {
   auto& doc = Document();
   auto* annotation = AppendElement(doc, parent, "xsd:annotation");
@@ -80,8 +80,15 @@ void VSchemaNode::Enum(const IEnum& enumeration) {
   }
 }
 
-bool VSchemaNode::Attribute(const std::string& name, std::string&, const std::string& documentation,
-                            const std::string& type, bool required, const IVersion& lower,
+bool VSchemaNode::AttributeText(std::string_view name, std::string_view&,
+                                std::string_view documentation, std::string_view type,
+                                bool required, const IVersion& lower, const IVersion& upper) {
+  std::string unused;
+  return Attribute(name, unused, documentation, type, required, lower, upper);
+}
+
+bool VSchemaNode::Attribute(std::string_view name, std::string&, std::string_view documentation,
+                            std::string_view type, bool required, const IVersion& lower,
                             const IVersion& upper) {
   auto& doc = Document();
   auto* attribute = doc.allocate_node(rapidxml::node_element, "xsd:attribute");
@@ -97,10 +104,11 @@ bool VSchemaNode::Attribute(const std::string& name, std::string&, const std::st
   return false;
 }
 
-void VSchemaNode::Child(const std::string& name, const std::string& documentation,
+void VSchemaNode::Child(std::string_view name, std::string_view documentation,
                         std::int32_t minOccurs, std::int32_t maxOccurs, const IVersion& lower,
                         const IVersion& upper) {
-  m_Declarations.push_back({name, documentation, minOccurs, maxOccurs, lower, upper});
+  m_Declarations.push_back(
+      {std::string(name), std::string(documentation), minOccurs, maxOccurs, lower, upper});
 }
 
 void VSchemaNode::Children(Handler handler, bool choice) {

@@ -10,6 +10,7 @@
 #include <memory>
 #include <set>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace UtilsRapidXml {
@@ -44,14 +45,19 @@ public:
   void SetVersion(const IVersion& version) override { m_pInfo->m_Version = version; }
   IVersion Version() const override { return m_pInfo->m_Version; }
   void Enum(const IEnum& enumeration) override;
-  void Child(const std::string& name, const std::string& documentation, std::int32_t minOccurs,
+  void Child(std::string_view name, std::string_view documentation, std::int32_t minOccurs,
              std::int32_t maxOccurs, const IVersion& lower = IVersion::None(),
              const IVersion& upper = IVersion::None()) override;
   void Children(Handler handler, bool choice = false) override;
   /// Records the attribute's declaration; always returns false (nothing is read).
-  bool Attribute(const std::string& name, std::string& o_rValue, const std::string& documentation,
-                 const std::string& type, bool required, const IVersion& lower = IVersion::None(),
+  bool Attribute(std::string_view name, std::string& o_rValue, std::string_view documentation,
+                 std::string_view type, bool required, const IVersion& lower = IVersion::None(),
                  const IVersion& upper = IVersion::None()) override;
+  /// As Attribute: records the declaration and returns false.
+  bool AttributeText(std::string_view name, std::string_view& o_rValue,
+                     std::string_view documentation, std::string_view type, bool required,
+                     const IVersion& lower = IVersion::None(),
+                     const IVersion& upper = IVersion::None()) override;
   void Error(const std::string& message) override { m_pInfo->m_Errors.push_back(message); }
   void Warning(const std::string& message) override { m_pInfo->m_Warnings.push_back(message); }
   std::uint64_t ErrorCount() const override { return m_pInfo->m_Errors.size(); }
@@ -71,7 +77,7 @@ private:
 
   rapidxml::xml_document<>& Document() const { return *m_pInfo->m_pDocument; }
   /// Appends "xsd:annotation" with version limits and documentation under `parent`.
-  void AppendAnnotation(rapidxml::xml_node<>* parent, const std::string& documentation,
+  void AppendAnnotation(rapidxml::xml_node<>* parent, std::string_view documentation,
                         const IVersion& lower, const IVersion& upper);
 
   std::shared_ptr<VSchemaInfo> m_pInfo;

@@ -17,14 +17,14 @@ std::string VWriterNode::Name() const {
   return std::string(NodeName(m_pNode));
 }
 
-bool VWriterNode::Attribute(const std::string& name, const std::string& value,
-                            const IVersion& lower, const IVersion& upper) {
+bool VWriterNode::Attribute(std::string_view name, std::string_view value, const IVersion& lower,
+                            const IVersion& upper) {
   if (IsOutOfRange(lower, upper)) return false;
   AppendAttribute(m_rDocument, m_pNode, name, value);
   return true;
 }
 
-bool VWriterNode::Child(const std::string& name, const Handler& handler, const IVersion& lower,
+bool VWriterNode::Child(std::string_view name, const Handler& handler, const IVersion& lower,
                         const IVersion& upper) {
   if (IsOutOfRange(lower, upper)) return false;
   VWriterNode child(m_rDocument, AppendElement(m_rDocument, m_pNode, name), m_pInfo);

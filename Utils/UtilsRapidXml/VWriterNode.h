@@ -9,6 +9,7 @@
 #include <functional>
 #include <memory>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace UtilsRapidXml {
@@ -35,18 +36,18 @@ public:
   }
 
   /// Adds the attribute unless the version is outside the limits; returns whether it did.
-  bool Attribute(const std::string& name, const std::string& value,
+  bool Attribute(std::string_view name, std::string_view value,
                  const IVersion& lower = IVersion::None(),
                  const IVersion& upper = IVersion::None());
 
   /// Inside the limits: appends the element `name` and runs `handler` on it. Returns whether the
   /// element was written.
-  bool Child(const std::string& name, const Handler& handler,
+  bool Child(std::string_view name, const Handler& handler,
              const IVersion& lower = IVersion::None(), const IVersion& upper = IVersion::None());
 
   /// One element `name` per item, `handler(node, item)` filling each; nothing for no items.
   template <class T, class F>
-  void Children(const std::string& name, const std::vector<T>& items, F&& handler,
+  void Children(std::string_view name, const std::vector<T>& items, F&& handler,
                 const IVersion& lower = IVersion::None(),
                 const IVersion& upper = IVersion::None()) {
     if (IsOutOfRange(lower, upper)) return;

@@ -10,50 +10,51 @@
 #include <cstdint>
 #include <span>
 #include <string>
+#include <string_view>
 
 namespace UtilsRapidXml {
 
-void ReportUnstringifiable(VWriterNode& node, const std::string& name);
+void ReportUnstringifiable(VWriterNode& node, std::string_view name);
 
-bool WriteString(VWriterNode& node, const std::string& name, const std::string& value,
+bool WriteString(VWriterNode& node, std::string_view name, std::string_view value,
                  const IVersion& lower = IVersion::None(),
                  const IVersion& upper = IVersion::None());
 
 /// "%.17g".
-bool WriteDouble(VWriterNode& node, const std::string& name, double value,
+bool WriteDouble(VWriterNode& node, std::string_view name, double value,
                  const IVersion& lower = IVersion::None(),
                  const IVersion& upper = IVersion::None());
 
 /// "*" for the unset value (the largest finite double), otherwise as WriteDouble.
-bool WriteOptionalDouble(VWriterNode& node, const std::string& name, double rawValue,
+bool WriteOptionalDouble(VWriterNode& node, std::string_view name, double rawValue,
                          const IVersion& lower = IVersion::None(),
                          const IVersion& upper = IVersion::None());
 
 /// "true" or "false".
-bool WriteBool(VWriterNode& node, const std::string& name, bool value,
+bool WriteBool(VWriterNode& node, std::string_view name, bool value,
                const IVersion& lower = IVersion::None(), const IVersion& upper = IVersion::None());
 
-bool WriteUnsigned(VWriterNode& node, const std::string& name, std::uint32_t value,
+bool WriteUnsigned(VWriterNode& node, std::string_view name, std::uint32_t value,
                    const IVersion& lower = IVersion::None(),
                    const IVersion& upper = IVersion::None());
 
 /// "major.minor".
-bool WriteVersion(VWriterNode& node, const std::string& name, const IVersion& value,
+bool WriteVersion(VWriterNode& node, std::string_view name, const IVersion& value,
                   const IVersion& lower = IVersion::None(),
                   const IVersion& upper = IVersion::None());
 
 /// Red, green and blue as integers separated by one blank; alpha is not written.
-bool WriteColour(VWriterNode& node, const std::string& name,
-                 const std::array<std::uint8_t, 4>& value, const IVersion& lower = IVersion::None(),
+bool WriteColour(VWriterNode& node, std::string_view name, const std::array<std::uint8_t, 4>& value,
+                 const IVersion& lower = IVersion::None(),
                  const IVersion& upper = IVersion::None());
 
 /// Numbers separated by one blank.
-bool WriteDoubleList(VWriterNode& node, const std::string& name, std::span<const double> values,
+bool WriteDoubleList(VWriterNode& node, std::string_view name, std::span<const double> values,
                      const IVersion& lower = IVersion::None(),
                      const IVersion& upper = IVersion::None());
 
 /// As WriteDoubleList with "*" for unset entries.
-bool WriteOptionalDoubleList(VWriterNode& node, const std::string& name,
+bool WriteOptionalDoubleList(VWriterNode& node, std::string_view name,
                              std::span<const double> rawValues,
                              const IVersion& lower = IVersion::None(),
                              const IVersion& upper = IVersion::None());
@@ -61,14 +62,14 @@ bool WriteOptionalDoubleList(VWriterNode& node, const std::string& name,
 /// Expressions separated by one blank. An expression with a blank outside single quotes is
 /// refused with "Node <name> attribute value <expression> contains spaces." and nothing is
 /// written.
-bool WriteExpressionList(VWriterNode& node, const std::string& name,
+bool WriteExpressionList(VWriterNode& node, std::string_view name,
                          std::span<const std::string> values,
                          const IVersion& lower = IVersion::None(),
                          const IVersion& upper = IVersion::None());
 
 /// The keyword of `value`; a value without one is reported as unstringifiable.
 template <class T>
-bool WriteEnum(VWriterNode& node, const std::string& name, const T& value,
+bool WriteEnum(VWriterNode& node, std::string_view name, const T& value,
                const VEnum<T>& enumeration, const IVersion& lower = IVersion::None(),
                const IVersion& upper = IVersion::None()) {
   if (node.IsOutOfRange(lower, upper)) return false;

@@ -1,0 +1,34 @@
+#pragma once
+// A set of small indices (positions of a node's attributes or children), held in one word for
+// the first 64 and spilling to the heap beyond.
+
+#include <cstddef>
+#include <cstdint>
+#include <vector>
+
+namespace UtilsRapidXml {
+
+class VVisitMarks {
+public:
+  void Set(std::size_t index) {
+    if (index < WordBits) {
+      m_Word |= std::uint64_t{1} << index;
+      return;
+    }
+    index -= WordBits;
+    if (m_More.size() <= index) m_More.resize(index + 1);
+    m_More[index] = true;
+  }
+  bool Test(std::size_t index) const {
+    if (index < WordBits) return (m_Word >> index) & 1u;
+    index -= WordBits;
+    return index < m_More.size() && m_More[index];
+  }
+
+private:
+  static constexpr std::size_t WordBits = 64;
+  std::uint64_t m_Word = 0;
+  std::vector<bool> m_More;
+};
+
+} // namespace UtilsRapidXml
