@@ -598,9 +598,18 @@ void decodeFrames(const uint8_t* i_pFrames, size_t i_frameBytes, size_t i_frames
 
 void decodeC3DPoints(const C3DContent& i_rContent, const uint8_t* i_pData, size_t i_firstFrame,
                      size_t i_frameCount, float* o_pPoints) {
-  const size_t points = size_t(i_rContent.pointCount);
+  decodeC3DPoints(i_rContent, i_pData, i_firstFrame, i_frameCount, 0, size_t(i_rContent.pointCount),
+                  o_pPoints);
+}
+
+void decodeC3DPoints(const C3DContent& i_rContent, const uint8_t* i_pData, size_t i_firstFrame,
+                     size_t i_frameCount, size_t i_firstPoint, size_t i_pointCount,
+                     float* o_pPoints) {
+  const size_t points = i_pointCount;
   const size_t bytes = i_rContent.frameBytes;
-  const uint8_t* pFrames = i_pData + i_rContent.dataStart + i_firstFrame * bytes;
+  const size_t pointBytes = i_rContent.scale < 0.0f ? 16 : 8;
+  const uint8_t* pFrames =
+      i_pData + i_rContent.dataStart + i_firstFrame * bytes + i_firstPoint * pointBytes;
   const C3D::EProcessor processor = i_rContent.processor;
   // One loop per number form, so that none chooses per value.
   if (i_rContent.scale < 0.0f) {

@@ -94,5 +94,9 @@ bool parseC3D(const uint8_t* i_pData, size_t i_size, C3DContent& o_rContent, std
 /// from `i_pData` into `o_pPoints`, laid out as `C3DContent::points`.
 void decodeC3DPoints(const C3DContent& i_rContent, const uint8_t* i_pData, size_t i_firstFrame,
                      size_t i_frameCount, float* o_pPoints);
+/// The same for points [i_firstPoint, i_firstPoint + i_pointCount) of each frame only.
+void decodeC3DPoints(const C3DContent& i_rContent, const uint8_t* i_pData, size_t i_firstFrame,
+                     size_t i_frameCount, size_t i_firstPoint, size_t i_pointCount,
+                     float* o_pPoints);
 
 } // namespace AnvilCore

@@ -63,23 +63,27 @@ void addPoints(const C3DContent& i_rContent, MappedFile& io_rFile, double i_toMi
     tracks[m]->reserve(frames);
   }
   const size_t blockFrames = std::max<size_t>(1, std::min(frames, kBlockBytes / (16 * points + 1)));
-  std::vector<float> block(blockFrames * points * 4);
-  std::vector<HTime> times(blockFrames);
+  std::vector<float> column(blockFrames * 4);
+  std::vector<HTime> times(blockFrames), keyTimes(blockFrames);
+  std::vector<Vec3> keyValues(blockFrames);
   for (size_t first = 0; first < frames; first += blockFrames) {
     const size_t count = std::min(blockFrames, frames - first);
-    decodeC3DPoints(i_rContent, io_rFile.data(), first, count, block.data());
     for (size_t f = 0; f < count; ++f)
       times[f] = io_rBuilder.frameTime(int64_t(i_rContent.firstFrame) + int64_t(first + f));
+    // Marker by marker: its values over the block's frames, then its present keys in one step.
     for (size_t m = 0; m < points; ++m) {
-      HPositionTrack& track = *tracks[m];
-      const float* p = &block[4 * m];
-      for (size_t f = 0; f < count; ++f, p += 4 * points)
-        if (p[3] >= 0.0f)
-          track.setKey(times[f], Vec3(p[0] * i_toMillimetres, p[1] * i_toMillimetres,
-                                      p[2] * i_toMillimetres));
+      decodeC3DPoints(i_rContent, io_rFile.data(), first, count, m, 1, column.data());
+      size_t present = 0;
+      for (size_t f = 0; f < count; ++f) {
+        const float* p = &column[4 * f];
+        if (p[3] < 0.0f) continue;
+        keyTimes[present] = times[f];
+        keyValues[present++] =
+            Vec3(p[0] * i_toMillimetres, p[1] * i_toMillimetres, p[2] * i_toMillimetres);
+      }
+      tracks[m]->appendKeys(keyTimes.data(), keyValues.data(), present);
     }
-    io_rFile.release(i_rContent.dataStart + first * i_rContent.frameBytes,
-                     count * i_rContent.frameBytes);
+    io_rFile.releaseBefore(i_rContent.dataStart + (first + count) * i_rContent.frameBytes);
   }
 }
 

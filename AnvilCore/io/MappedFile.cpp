@@ -43,12 +43,16 @@ bool MappedFile::open(const std::string& i_path, std::string& o_rError) {
   return true;
 }
 
-void MappedFile::release(size_t i_offset, size_t i_length) {
-  if (!m_pData || i_offset >= m_size) return;
-  const size_t page = size_t(::sysconf(_SC_PAGESIZE));
-  const size_t end = std::min(m_size, i_offset + i_length) / page * page;
-  const size_t start = (i_offset + page - 1) / page * page;
-  if (end > start) ::madvise(const_cast<uint8_t*>(m_pData) + start, end - start, MADV_DONTNEED);
+void MappedFile::releaseBefore(size_t i_offset) {
+  constexpr uintptr_t kUnit = uintptr_t(2) << 20;
+  if (!m_pData) return;
+  const uintptr_t base = reinterpret_cast<uintptr_t>(m_pData);
+  const uintptr_t end = (base + std::min(i_offset, m_size)) / kUnit * kUnit;
+  const uintptr_t start =
+      std::max(base + m_releasedTo, (base + m_releasedTo + kUnit - 1) / kUnit * kUnit);
+  if (end <= start) return;
+  ::madvise(reinterpret_cast<void*>(start), end - start, MADV_DONTNEED);
+  m_releasedTo = end - base;
 }
 
 } // namespace AnvilCore

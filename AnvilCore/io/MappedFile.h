@@ -21,13 +21,15 @@ public:
   /// The bytes; null for an empty file.
   const uint8_t* data() const { return m_pData; }
   size_t size() const { return m_size; }
-  /// Drops the whole pages within [i_offset, i_offset + i_length) from memory; reading them
-  /// again reads them from the file.
-  void release(size_t i_offset, size_t i_length);
+  /// Drops from memory what is mapped of the bytes before `i_offset`, in whole units of 2 MB
+  /// (the huge pages the system may map a file with, which a smaller release would split);
+  /// reading them again reads them from the file.
+  void releaseBefore(size_t i_offset);
 
 private:
   const uint8_t* m_pData = nullptr;
   size_t m_size = 0;
+  size_t m_releasedTo = 0; ///< bytes before this offset are released
 };
 
 } // namespace AnvilCore

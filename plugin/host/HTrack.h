@@ -51,18 +51,42 @@ public:
       m_values.push_back(i_rValue);
       return;
     }
-    const size_t index = lowerBound(i_t);
-    if (index < m_values.size() && getKeyTime(int(index)) == i_t) {
-      m_values[index] = i_rValue;
+    setKeyWithin(i_t, i_rValue);
+  }
+  /// Appends keys at increasing times, all after the last key, in one step; keys out of that
+  /// order are set one by one as `setKey` does.
+  void appendKeys(const HTime* i_pTimes, const T* i_pValues, size_t i_count) {
+    if (i_count == 0) return;
+    if (!m_values.empty() && i_pTimes[0] <= m_runs.back().last()) {
+      for (size_t i = 0; i < i_count; ++i)
+        setKey(i_pTimes[i], i_pValues[i]);
       return;
     }
-    // A key between others: the runs are built again around it.
-    std::vector<HTime> all = times();
-    all.insert(all.begin() + static_cast<long>(index), i_t);
-    m_values.insert(m_values.begin() + static_cast<long>(index), i_rValue);
-    m_runs.clear();
-    for (const HTime t : all)
-      appendTime(t);
+    dropTimes();
+    size_t i = 0;
+    if (m_runs.empty()) {
+      m_runs.push_back({i_pTimes[0], 0, 0, 1});
+      i = 1;
+    }
+    // The last run is extended in a local copy and stored back when a new one begins.
+    Run run = m_runs.back();
+    HTime last = run.last();
+    for (; i < i_count && i_pTimes[i] > last; ++i) {
+      const uint64_t step = uint64_t(i_pTimes[i]) - uint64_t(last);
+      if (run.count == 1) run.step = step;
+      if (run.step == step) {
+        ++run.count;
+      } else {
+        m_runs.back() = run;
+        run = {i_pTimes[i], 0, run.first + run.count, 1};
+        m_runs.push_back(run);
+      }
+      last = i_pTimes[i];
+    }
+    m_runs.back() = run;
+    m_values.insert(m_values.end(), i_pValues, i_pValues + i);
+    for (; i < i_count; ++i)
+      setKey(i_pTimes[i], i_pValues[i]);
   }
   void clear() {
     m_runs.clear();
@@ -140,6 +164,22 @@ public:
   };
 
 private:
+  // A key at or before the last one: replaces the key at that time, or goes between others.
+  [[gnu::noinline]] void setKeyWithin(HTime i_t, const T& i_rValue) {
+    const size_t index = lowerBound(i_t);
+    if (index < m_values.size() && getKeyTime(int(index)) == i_t) {
+      m_values[index] = i_rValue;
+      return;
+    }
+    // A key between others: the runs are built again around it.
+    std::vector<HTime> all = times();
+    all.insert(all.begin() + static_cast<long>(index), i_t);
+    m_values.insert(m_values.begin() + static_cast<long>(index), i_rValue);
+    m_runs.clear();
+    for (const HTime t : all)
+      appendTime(t);
+  }
+
   size_t runOfIndex(size_t i_index) const {
     auto it = std::upper_bound(m_runs.begin(), m_runs.end(), i_index,
                                [](size_t i, const Run& run) { return i < run.first; });

@@ -273,3 +273,29 @@ TEST(HostTracks, RunsAnswerAsASortedListOfTimes) {
   int first = -1;
   EXPECT_EQ(wide.countInRange(1, INT64_MAX, first), 1);
 }
+
+// Appending keys in one step builds the track that setting them one by one builds, also when a
+// batch holds times out of order or before the last key.
+TEST(HostTracks, AppendingKeysMatchesSettingThem) {
+  std::mt19937 gen(8);
+  for (int round = 0; round < 100; ++round) {
+    HVec3Track appended, set;
+    HTime t = HTime(gen() % 50);
+    for (int batch = 0; batch < 5; ++batch) {
+      std::vector<HTime> times;
+      std::vector<Vec3> values;
+      const int count = int(gen() % 20);
+      for (int k = 0; k < count; ++k) {
+        t += gen() % 4 == 0 ? HTime(gen() % 300) + 1 : 100;
+        times.push_back(gen() % 25 == 0 ? HTime(gen() % 2000) : t);
+        values.push_back(Vec3(double(gen() % 100), double(k), double(batch)));
+      }
+      appended.appendKeys(times.data(), values.data(), times.size());
+      for (size_t k = 0; k < times.size(); ++k)
+        set.setKey(times[k], values[k]);
+    }
+    ASSERT_EQ(appended.times(), set.times());
+    for (int i = 0; i < set.getNumKeys(); ++i)
+      ASSERT_EQ(appended.getKeyValue(i), set.getKeyValue(i));
+  }
+}
