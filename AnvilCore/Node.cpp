@@ -91,4 +91,10 @@ Vec3 Marker::getWSPos(HTime i_t) const {
   return pos;
 }
 
+Vec3 Marker::getWSKeyPos(int i_index) const {
+  Vec3 pos = m_track.getKeyValue(i_index);
+  AnvilCoreImpl::applySceneRotation(pos);
+  return pos;
+}
+
 Character::Character(const HString& i_rName) : Node(i_rName) {}

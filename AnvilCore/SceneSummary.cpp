@@ -88,7 +88,7 @@ void describeScene(std::ostream& o_rOut) {
   std::vector<std::string> optical, video;
   for (int i = 0; i < g_db->getNumOpticalCameras(); ++i) {
     const OpticalCamera* pCamera = g_db->getOpticalCamera(i);
-    optical.push_back("#" + std::to_string(pCamera->getCameraNumber()) + " \"" +
+    optical.push_back(std::string("#").append(std::to_string(pCamera->getCameraNumber())) + " \"" +
                       pCamera->getName().GetString() + "\"" +
                       (pCamera->isCalibrated() ? "" : " (uncalibrated)"));
   }

@@ -1,6 +1,8 @@
 // C3D export of a long take: 200 markers x 36,000 frames (five minutes at 120 Hz), in float and
 // integer form, against writing the same number of bytes with one plain fwrite per frame. The
-// ratios of each export to its floor are printed after the table.
+// ratios of each export to its floor are printed after the table; "peak MB" is the most the
+// export allocates.
+#include "AllocationCounter.h"
 #include "AnvilCore/ExportDriver.h"
 #include "LongTake.h"
 #include "exporters/trajectory/C3DExporter.h"
@@ -42,10 +44,14 @@ void BM_C3DExport(benchmark::State& state) {
   AnvilCore::ExportRequest request;
   request.path = outputPath(".c3d");
   std::string error;
+  int64_t peak = 0;
   for (auto _ : state) {
+    const Bench::PeakAllocation allocation;
     if (AnvilCore::runExport(*pExporter, request, error) != AnvilCore::EExportStatus::EOk)
       state.SkipWithError(error.c_str());
+    peak = allocation.bytes();
   }
+  state.counters["peak MB"] = double(peak) / 1e6;
   const uintmax_t bytes = std::filesystem::file_size(request.path);
   exportedBytes()[real] = bytes;
   state.SetBytesProcessed(int64_t(state.iterations()) * int64_t(bytes));

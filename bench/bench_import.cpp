@@ -1,9 +1,13 @@
 // Import throughput of the C3D and TRC readers on a long take: 100 markers x 12,000 frames
 // (100 s at 120 Hz). Parsing alone (from memory) and a whole read into the scene (from a file)
-// are measured, each against a floor that only decodes the same numbers without structure.
+// are measured, each against a floor that only decodes the same numbers without structure. The
+// ratios of the reads to their floors, and the peak memory of a C3D read against the point data
+// of the file, are printed after the table.
+#include "AllocationCounter.h"
 #include "AnvilCore/io/C3DReader.h"
 #include "AnvilCore/io/ISceneReader.h"
 #include "AnvilCore/io/TrcReader.h"
+#include "RatioReporter.h"
 #include "plugin/host/Database.h"
 #include "tests/AnvilCore/io/C3DTestFile.h"
 #include <benchmark/benchmark.h>
@@ -16,6 +20,7 @@
 #include <unistd.h>
 
 namespace {
+double s_c3dMemoryRatio = 0.0;
 constexpr int kMarkers = 100;
 constexpr int kFrames = 12000;
 
@@ -126,15 +131,22 @@ void BM_C3DReadIntoScene(benchmark::State& state) {
       writeTemp(".c3d", reinterpret_cast<const char*>(bytes.data()), bytes.size());
   AnvilCore::ISceneReader* pReader = AnvilCore::SceneReaderRegistry::instance().find(path);
   std::string error;
+  int64_t peak = 0;
   for (auto _ : state) {
     state.PauseTiming();
     g_db->clearScene();
+    const Bench::PeakAllocation allocation;
     state.ResumeTiming();
     if (!pReader->read(path, error)) state.SkipWithError(error.c_str());
+    peak = allocation.bytes();
   }
   g_db->clearScene();
   std::filesystem::remove(path);
   setCounters(state, bytes.size());
+  // The point data of the file: x, y, z and residual of every point in every frame, as floats.
+  const double pointBytes = 16.0 * kMarkers * kFrames;
+  state.counters["peak MB"] = double(peak) / 1e6;
+  s_c3dMemoryRatio = double(peak) / pointBytes;
 }
 BENCHMARK(BM_C3DReadIntoScene)->Unit(benchmark::kMillisecond);
 
@@ -174,18 +186,34 @@ void BM_TrcReadIntoScene(benchmark::State& state) {
   const std::string path = writeTemp(".trc", text.data(), text.size());
   AnvilCore::ISceneReader* pReader = AnvilCore::SceneReaderRegistry::instance().find(path);
   std::string error;
+  int64_t peak = 0;
   for (auto _ : state) {
     state.PauseTiming();
     g_db->clearScene();
+    const Bench::PeakAllocation allocation;
     state.ResumeTiming();
     if (!pReader->read(path, error)) state.SkipWithError(error.c_str());
+    peak = allocation.bytes();
   }
   g_db->clearScene();
   std::filesystem::remove(path);
   setCounters(state, text.size());
+  state.counters["peak MB"] = double(peak) / 1e6;
 }
 BENCHMARK(BM_TrcReadIntoScene)->Unit(benchmark::kMillisecond);
 
 } // namespace
 
-BENCHMARK_MAIN();
+int main(int argc, char** argv) {
+  benchmark::Initialize(&argc, argv);
+  Bench::RatioReporter reporter;
+  benchmark::RunSpecifiedBenchmarks(&reporter);
+  reporter.printRatio("BM_C3DReadIntoScene / BM_C3DDecodeFloor", "BM_C3DReadIntoScene",
+                      "BM_C3DDecodeFloor");
+  reporter.printRatio("BM_TrcReadIntoScene / BM_TrcStrtodFloor", "BM_TrcReadIntoScene",
+                      "BM_TrcStrtodFloor");
+  if (s_c3dMemoryRatio > 0.0)
+    std::printf("BM_C3DReadIntoScene peak memory / point data: %.2f\n", s_c3dMemoryRatio);
+  benchmark::Shutdown();
+  return 0;
+}

@@ -73,8 +73,12 @@ namespace {
 // Writes the bytes to a sibling of the path and renames it over the path once complete.
 bool replaceFile(const std::string& i_rPath, const VFbxByteSink& i_rBytes, std::string& o_rError) {
   const std::filesystem::path path(i_rPath);
-  const std::filesystem::path temp =
-      path.parent_path() / ("." + path.filename().string() + ".fbx-" + std::to_string(::getpid()));
+  // Built by appending: GCC 12 warns falsely (-Wrestrict) on a chain of string additions here.
+  std::string tempName = ".";
+  tempName += path.filename().string();
+  tempName += ".fbx-";
+  tempName += std::to_string(::getpid());
+  const std::filesystem::path temp = path.parent_path() / tempName;
   std::FILE* pFile = std::fopen(temp.c_str(), "wb");
   if (!pFile) {
     o_rError = "cannot create '" + i_rPath + "': " + std::strerror(errno);

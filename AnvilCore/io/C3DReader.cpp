@@ -103,8 +103,8 @@ const C3DParameter* C3DContent::find(const std::string& i_group, const std::stri
 /// Reads the three sections of a file in order: header, parameters, frames.
 class C3DParser {
 public:
-  C3DParser(const uint8_t* i_pData, size_t i_size, C3DContent& o_rContent)
-      : m_pData(i_pData), m_size(i_size), m_rOut(o_rContent) {}
+  C3DParser(const uint8_t* i_pData, size_t i_size, C3DContent& o_rContent, bool i_decodePoints)
+      : m_pData(i_pData), m_size(i_size), m_rOut(o_rContent), m_decodePoints(i_decodePoints) {}
 
   void parse() {
     readHeaderStart();
@@ -527,31 +527,11 @@ private:
                                 std::to_string(whole) + " read");
       m_rOut.frameCount = int(whole);
     }
-    const size_t frames = size_t(m_rOut.frameCount);
-    const bool isFloat = m_rOut.scale < 0.0f;
-    const float scale = std::fabs(m_rOut.scale);
-    const size_t points = size_t(m_rOut.pointCount);
-    if (points == 0) return;
-    m_rOut.points.resize(frames * points * 4);
-    float* pOut = m_rOut.points.data();
-    for (size_t f = 0; f < frames; ++f) {
-      const uint8_t* p = m_pData + m_dataStart + f * bytes;
-      for (size_t i = 0; i < points; ++i, pOut += 4) {
-        if (isFloat) {
-          for (int k = 0; k < 4; ++k)
-            pOut[k] = C3D::getFloat(p + 4 * k, m_rOut.processor);
-          p += 16;
-        } else {
-          for (int k = 0; k < 3; ++k)
-            pOut[k] = float(int16_t(word(size_t(p - m_pData) + 2 * k))) * scale;
-          const int16_t residual = int16_t(word(size_t(p - m_pData) + 6));
-          pOut[3] = residual < 0 ? -1.0f : float(residual & 0xFF) * scale;
-          p += 8;
-        }
-        if (!std::isfinite(pOut[0]) || !std::isfinite(pOut[1]) || !std::isfinite(pOut[2]))
-          pOut[3] = -1.0f;
-      }
-    }
+    m_rOut.dataStart = m_dataStart;
+    m_rOut.frameBytes = bytes;
+    if (!m_decodePoints || m_rOut.pointCount == 0) return;
+    m_rOut.points.resize(size_t(m_rOut.frameCount) * size_t(m_rOut.pointCount) * 4);
+    decodeC3DPoints(m_rOut, m_pData, 0, size_t(m_rOut.frameCount), m_rOut.points.data());
   }
 
   void readAnalog() {
@@ -590,6 +570,7 @@ private:
   const uint8_t* m_pData;
   size_t m_size;
   C3DContent& m_rOut;
+  bool m_decodePoints;
   float m_headerScale = 0.0f;
   float m_parameterScale = 0.0f;
   bool m_hasParameterScale = false;
@@ -599,11 +580,75 @@ private:
   std::vector<int> m_groupIds;
 };
 
-bool parseC3D(const uint8_t* i_pData, size_t i_size, C3DContent& o_rContent,
-              std::string& o_rError) {
+namespace {
+// Points of frames in one number form: `i_read` gives the four values of one point as floats.
+template <typename Read>
+void decodeFrames(const uint8_t* i_pFrames, size_t i_frameBytes, size_t i_frames, size_t i_points,
+                  size_t i_pointBytes, float* o_pOut, Read i_read) {
+  for (size_t f = 0; f < i_frames; ++f) {
+    const uint8_t* p = i_pFrames + f * i_frameBytes;
+    for (size_t i = 0; i < i_points; ++i, p += i_pointBytes, o_pOut += 4) {
+      i_read(p, o_pOut);
+      if (!std::isfinite(o_pOut[0]) || !std::isfinite(o_pOut[1]) || !std::isfinite(o_pOut[2]))
+        o_pOut[3] = -1.0f;
+    }
+  }
+}
+} // namespace
+
+void decodeC3DPoints(const C3DContent& i_rContent, const uint8_t* i_pData, size_t i_firstFrame,
+                     size_t i_frameCount, float* o_pPoints) {
+  decodeC3DPoints(i_rContent, i_pData, i_firstFrame, i_frameCount, 0, size_t(i_rContent.pointCount),
+                  o_pPoints);
+}
+
+void decodeC3DPoints(const C3DContent& i_rContent, const uint8_t* i_pData, size_t i_firstFrame,
+                     size_t i_frameCount, size_t i_firstPoint, size_t i_pointCount,
+                     float* o_pPoints) {
+  const size_t points = i_pointCount;
+  const size_t bytes = i_rContent.frameBytes;
+  const size_t pointBytes = i_rContent.scale < 0.0f ? 16 : 8;
+  const uint8_t* pFrames =
+      i_pData + i_rContent.dataStart + i_firstFrame * bytes + i_firstPoint * pointBytes;
+  const C3D::EProcessor processor = i_rContent.processor;
+  // One loop per number form, so that none chooses per value.
+  if (i_rContent.scale < 0.0f) {
+    auto floats = [&](auto i_read) {
+      decodeFrames(pFrames, bytes, i_frameCount, points, 16, o_pPoints,
+                   [&](const uint8_t* i_p, float* o_p) {
+                     for (int k = 0; k < 4; ++k)
+                       o_p[k] = i_read(i_p + 4 * k);
+                   });
+    };
+    if (processor == C3D::EProcessorDec)
+      floats([](const uint8_t* i_p) { return C3D::decToIeee(i_p); });
+    else if (processor == C3D::EProcessorMips)
+      floats([](const uint8_t* i_p) { return C3D::getFloat(i_p, C3D::EProcessorMips); });
+    else
+      floats([](const uint8_t* i_p) { return C3D::getFloat(i_p, C3D::EProcessorIntel); });
+    return;
+  }
+  const float scale = std::fabs(i_rContent.scale);
+  auto words = [&](auto i_word) {
+    decodeFrames(pFrames, bytes, i_frameCount, points, 8, o_pPoints,
+                 [&](const uint8_t* i_p, float* o_p) {
+                   for (int k = 0; k < 3; ++k)
+                     o_p[k] = float(int16_t(i_word(i_p + 2 * k))) * scale;
+                   const int16_t residual = int16_t(i_word(i_p + 6));
+                   o_p[3] = residual < 0 ? -1.0f : float(residual & 0xFF) * scale;
+                 });
+  };
+  if (processor == C3D::EProcessorMips)
+    words([](const uint8_t* i_p) { return C3D::getU16BE(i_p); });
+  else
+    words([](const uint8_t* i_p) { return C3D::getU16LE(i_p); });
+}
+
+bool parseC3D(const uint8_t* i_pData, size_t i_size, C3DContent& o_rContent, std::string& o_rError,
+              bool i_decodePoints) {
   o_rContent = C3DContent();
   try {
-    C3DParser(i_pData, i_size, o_rContent).parse();
+    C3DParser(i_pData, i_size, o_rContent, i_decodePoints).parse();
     return true;
   } catch (const C3DError& e) {
     // Messages quote names from the file, which may hold NULs or control characters.

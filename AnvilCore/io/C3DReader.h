@@ -46,7 +46,10 @@ struct C3DContent {
   /// same place, or the prefix without its trailing ":" when there is none.
   std::vector<SubjectPrefix> subjectPrefixes;
   /// frameCount * pointCount entries of x, y, z, residual; a negative residual marks a gap.
+  /// Left empty by a parse that does not decode them (see `decodeC3DPoints`).
   std::vector<float> points;
+  size_t dataStart = 0;  ///< byte offset of the first frame
+  size_t frameBytes = 0; ///< bytes of one frame: points, then analog
 
   int analogChannels = 0;
   int analogSamplesPerFrame = 0;
@@ -82,6 +85,18 @@ private:
 /// frames, labels past 255 (LABELS2, ...), long files (TRIAL:ACTUAL_*_FIELD, POINT:FRAMES,
 /// POINT:DRU_*_FRAME). On failure returns false with a message naming what is wrong and the
 /// byte offset where it was found; `o_rContent` is then unspecified.
-bool parseC3D(const uint8_t* i_pData, size_t i_size, C3DContent& o_rContent, std::string& o_rError);
+/// With `i_decodePoints` false, `points` stays empty and the frames are only checked to lie in
+/// the file; `decodeC3DPoints` then decodes them part by part.
+bool parseC3D(const uint8_t* i_pData, size_t i_size, C3DContent& o_rContent, std::string& o_rError,
+              bool i_decodePoints = true);
+
+/// Decodes the points of frames [i_firstFrame, i_firstFrame + i_frameCount) of a file parsed
+/// from `i_pData` into `o_pPoints`, laid out as `C3DContent::points`.
+void decodeC3DPoints(const C3DContent& i_rContent, const uint8_t* i_pData, size_t i_firstFrame,
+                     size_t i_frameCount, float* o_pPoints);
+/// The same for points [i_firstPoint, i_firstPoint + i_pointCount) of each frame only.
+void decodeC3DPoints(const C3DContent& i_rContent, const uint8_t* i_pData, size_t i_firstFrame,
+                     size_t i_frameCount, size_t i_firstPoint, size_t i_pointCount,
+                     float* o_pPoints);
 
 } // namespace AnvilCore

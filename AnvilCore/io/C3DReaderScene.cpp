@@ -1,15 +1,21 @@
 // The C3D input reader: markers (with their subjects) and analog channels into the scene.
 #include "C3DReader.h"
 #include "ISceneReader.h"
+#include "MappedFile.h"
 #include "TrajectoryScene.h"
 #include "plugin/host/AudioSource.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/Marker.h"
+#include <algorithm>
 #include <cmath>
+#include <vector>
 
 namespace AnvilCore {
 
 namespace {
+
+// Frames decoded at a time: about this many bytes of floats.
+constexpr size_t kBlockBytes = size_t(1) << 18;
 
 // Consecutive channels with one label form one source; each source starts at the first frame,
 // runs at the analog rate as the file gives it, and keeps the readings at full precision with
@@ -44,17 +50,54 @@ void addAnalogSources(const C3DContent& i_rContent, TrajectorySceneBuilder& io_r
   }
 }
 
+// The frames are decoded a block at a time straight into the tracks, each reserved once for
+// every frame; the file's pages of a block are let go once it is read.
+void addPoints(const C3DContent& i_rContent, MappedFile& io_rFile, double i_toMillimetres,
+               TrajectorySceneBuilder& io_rBuilder) {
+  const size_t points = size_t(i_rContent.pointCount);
+  const size_t frames = size_t(i_rContent.frameCount);
+  if (points == 0 || frames == 0) return;
+  std::vector<HPositionTrack*> tracks(points);
+  for (size_t m = 0; m < points; ++m) {
+    tracks[m] = &io_rBuilder.marker(int(m)).m_track;
+    tracks[m]->reserve(frames);
+  }
+  const size_t blockFrames = std::max<size_t>(1, std::min(frames, kBlockBytes / (16 * points + 1)));
+  std::vector<float> column(blockFrames * 4);
+  std::vector<HTime> times(blockFrames), keyTimes(blockFrames);
+  std::vector<Vec3> keyValues(blockFrames);
+  for (size_t first = 0; first < frames; first += blockFrames) {
+    const size_t count = std::min(blockFrames, frames - first);
+    for (size_t f = 0; f < count; ++f)
+      times[f] = io_rBuilder.frameTime(int64_t(i_rContent.firstFrame) + int64_t(first + f));
+    // Marker by marker: its values over the block's frames, then its present keys in one step.
+    for (size_t m = 0; m < points; ++m) {
+      decodeC3DPoints(i_rContent, io_rFile.data(), first, count, m, 1, column.data());
+      size_t present = 0;
+      for (size_t f = 0; f < count; ++f) {
+        const float* p = &column[4 * f];
+        if (p[3] < 0.0f) continue;
+        keyTimes[present] = times[f];
+        keyValues[present++] =
+            Vec3(p[0] * i_toMillimetres, p[1] * i_toMillimetres, p[2] * i_toMillimetres);
+      }
+      tracks[m]->appendKeys(keyTimes.data(), keyValues.data(), present);
+    }
+    io_rFile.releaseBefore(i_rContent.dataStart + (first + count) * i_rContent.frameBytes);
+  }
+}
+
 class C3DSceneReader : public ISceneReader {
 public:
   std::vector<std::string> extensions() const override { return {"c3d"}; }
   std::string description() const override { return "C3D motion capture file"; }
 
   bool read(const std::string& i_path, std::string& o_rError) override {
-    std::string bytes;
-    if (!readWholeFile(i_path, bytes, o_rError)) return false;
+    MappedFile file;
+    if (!file.open(i_path, o_rError)) return false;
     C3DContent content;
     std::string error;
-    if (!parseC3D(reinterpret_cast<const uint8_t*>(bytes.data()), bytes.size(), content, error)) {
+    if (!parseC3D(file.data(), file.size(), content, error, false)) {
       o_rError = i_path + ": " + error;
       return false;
     }
@@ -63,16 +106,7 @@ public:
     const double toMillimetres =
         content.units.empty() ? 1.0 : fileUnitsToMillimetres(i_path, content.units);
     TrajectorySceneBuilder builder(content.frameRate, content.labels, content.subjectPrefixes);
-    for (int m = 0; m < content.pointCount; ++m) {
-      HPositionTrack& track = builder.marker(m).m_track;
-      track.reserve(size_t(content.frameCount));
-      for (int f = 0; f < content.frameCount; ++f) {
-        const float* p = content.point(f, m);
-        if (p[3] < 0.0f) continue;
-        track.setKey(builder.frameTime(int64_t(content.firstFrame) + f),
-                     Vec3(p[0] * toMillimetres, p[1] * toMillimetres, p[2] * toMillimetres));
-      }
-    }
+    addPoints(content, file, toMillimetres, builder);
     addAnalogSources(content, builder);
     builder.commit(content.firstFrame, int64_t(content.firstFrame) + content.frameCount - 1);
     g_db->logInfo("%s: %d markers, %d frames from %d at %g Hz, %d analog channels", i_path.c_str(),

@@ -1,9 +1,11 @@
 // The TRC input reader: marker trajectories (with "Subject:Marker" names as subjects).
 #include "ISceneReader.h"
+#include "MappedFile.h"
 #include "TrajectoryScene.h"
 #include "TrcReader.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/Marker.h"
+#include <vector>
 
 namespace AnvilCore {
 
@@ -15,17 +17,23 @@ public:
   std::string description() const override { return "TRC marker trajectories"; }
 
   bool read(const std::string& i_path, std::string& o_rError) override {
-    std::string text;
-    if (!readWholeFile(i_path, text, o_rError)) return false;
+    MappedFile file;
+    if (!file.open(i_path, o_rError)) return false;
     TrcContent content;
     std::string error;
-    if (!parseTrc(text.data(), text.size(), content, error)) {
+    if (!parseTrc(reinterpret_cast<const char*>(file.data()), file.size(), content, error)) {
       o_rError = i_path + ": " + error;
       return false;
     }
     logReaderWarnings(i_path, content.warnings);
     const double toMillimetres = fileUnitsToMillimetres(i_path, content.units);
     TrajectorySceneBuilder builder(content.dataRate, content.labels);
+    // Each track is reserved once for its samples.
+    std::vector<size_t> counts(content.labels.size(), 0);
+    for (const TrcContent::Sample& sample : content.samples)
+      ++counts[size_t(sample.marker)];
+    for (size_t m = 0; m < counts.size(); ++m)
+      builder.marker(int(m)).m_track.reserve(counts[m]);
     for (const TrcContent::Sample& sample : content.samples)
       builder.marker(sample.marker)
           .m_track.setKey(

@@ -62,7 +62,7 @@ std::vector<Joint> gatherJoints(Character& i_rSubject) {
     path.Replace(pPrefix, "");
     // The host's paths start at its root separator; joints are relative paths of identifiers.
     std::string token = AnvilUsd::MakeValidRelativePath(path.GetString());
-    if (token.empty()) token = "_";
+    if (token.empty()) token.push_back('_');
     // Names that collide once made valid get a number.
     const std::string base = token;
     for (int n = 1; !taken.insert(token).second; ++n)

@@ -179,7 +179,7 @@ void C3DExporter::computeScale() {
   for (const Marker* pMarker : m_markers) {
     const HPositionTrack& track = pMarker->m_track;
     for (int i = 0; i < track.getNumKeys(); ++i) {
-      const Vec3 p = pMarker->getWSPos(track.getKeyTime(i));
+      const Vec3 p = pMarker->getWSKeyPos(i);
       for (int axis = 0; axis < 3; ++axis) {
         if (p[axis] > highest) highest = p[axis];
         if (p[axis] < lowest) lowest = p[axis];

@@ -1,16 +1,21 @@
 // The header block and the frames of a C3D export.
 #include "C3DExporter.h"
+#include "MarkerCursor.h"
 #include "c3d/C3DFormat.h"
 #include "plugin/host/AudioSource.h"
 #include "plugin/host/HTimeManager.h"
 #include "plugin/host/Marker.h"
 #include "plugin/host/OperationStack.h"
+#include <algorithm>
 #include <cmath>
 #include <cstdio>
 #include <memory>
 #include <vector>
 
 namespace {
+// Frames are written in blocks of about this many bytes.
+constexpr size_t kBlockBytes = size_t(1) << 20;
+
 // Truncation toward zero to a 32-bit integer, saturating where a cast would be undefined.
 int32_t truncateToInt32(double i_value) {
   if (!(i_value > -2147483648.0)) return i_value != i_value ? 0 : INT32_MIN;
@@ -60,8 +65,9 @@ void C3DExporter::writeFrames() {
   const bool real = m_scale < 0.0f;
   const size_t valueSize = real ? 4 : 2;
   const int spf = m_samplesPerFrame;
-  const size_t frameSize =
-      valueSize * (size_t(spf) * size_t(m_analogChannels) + 4 * size_t(m_pointCount));
+  const size_t pointValues = 4 * size_t(m_pointCount);
+  const size_t frameValues = size_t(spf) * size_t(m_analogChannels) + pointValues;
+  const size_t frameSize = valueSize * frameValues;
   const double inverseScale = 1.0 / double(m_scale);
 
   std::vector<ChannelSamples> channels;
@@ -72,53 +78,64 @@ void C3DExporter::writeFrames() {
       channels.push_back(std::move(channel));
     }
 
-  // Times only grow, so each marker keeps the index of its first key not before t - T/2: the
-  // gap test is then the track's range count without a search per frame.
-  std::vector<size_t> firstKey(size_t(m_markers.getCount()), 0);
+  // Times only grow, so each marker's cursor keeps its first key not before t - T/2: the gap
+  // test and the key's value need no search per frame.
+  std::vector<TrajectoryExport::MarkerCursor> cursors;
+  cursors.reserve(size_t(m_markers.getCount()));
+  for (const Marker* pMarker : m_markers)
+    cursors.emplace_back(pMarker);
 
-  std::vector<uint8_t> buffer(frameSize);
+  // Each frame's values are gathered in their number form, then converted to the file's bytes
+  // in one pass; whole frames fill a block that goes out in one fwrite.
+  std::vector<float> reals(real ? frameValues : 0);
+  std::vector<int16_t> words(real ? 0 : frameValues);
+  const size_t blockFrames = std::max<size_t>(1, kBlockBytes / std::max<size_t>(frameSize, 1));
+  std::vector<uint8_t> block(blockFrames * frameSize);
+  size_t framesInBlock = 0;
   std::fseek(m_pFile, long(m_dataStartBlock - 1) * C3D::kBlockSize, SEEK_SET);
   int frameIndex = 0;
   for (HTime t = m_timeRange.getStart(); t <= m_timeRange.getEnd(); t += ticksPerFrame) {
-    uint8_t* p = buffer.data();
     const HTime low = t - half, high = t - half + 2 * half;
-    for (int m = 0; m < m_markers.getCount(); ++m) {
-      const Marker* pMarker = m_markers[m];
-      bool present = true;
-      if (m_options.m_preserveGaps) {
-        const std::vector<HTime>& times = pMarker->m_track.times();
-        size_t& k = firstKey[size_t(m)];
-        while (k < times.size() && times[k] < low)
-          ++k;
-        present = k < times.size() && times[k] <= high;
-      }
-      const Vec3 pos = present ? pMarker->getWSPos(t) : Vec3();
+    for (size_t m = 0; m < cursors.size(); ++m) {
+      TrajectoryExport::MarkerCursor& cursor = cursors[m];
+      cursor.advanceTo(low);
+      const bool present = !m_options.m_preserveGaps || cursor.hasKeyUpTo(high);
+      const Vec3 pos = present ? cursor.position(t) : Vec3();
       if (real) {
-        for (int axis = 0; axis < 3; ++axis, p += 4)
-          C3D::putFloat(p, float(pos[axis]), dec);
-        C3D::putFloat(p, present ? 0.0f : -1.0f, dec);
-        p += 4;
+        float* pValue = &reals[4 * m];
+        pValue[0] = float(pos.x);
+        pValue[1] = float(pos.y);
+        pValue[2] = float(pos.z);
+        pValue[3] = present ? 0.0f : -1.0f;
       } else {
-        for (int axis = 0; axis < 3; ++axis, p += 2)
-          C3D::putU16LE(p, uint16_t(truncateToInt32(inverseScale * pos[axis])));
-        C3D::putU16LE(p, present ? 0 : 0x8000);
-        p += 2;
+        int16_t* pValue = &words[4 * m];
+        pValue[0] = int16_t(uint16_t(truncateToInt32(inverseScale * pos.x)));
+        pValue[1] = int16_t(uint16_t(truncateToInt32(inverseScale * pos.y)));
+        pValue[2] = int16_t(uint16_t(truncateToInt32(inverseScale * pos.z)));
+        pValue[3] = present ? int16_t(0) : int16_t(uint16_t(0x8000));
       }
     }
+    size_t v = pointValues;
     for (int s = 0; s < spf; ++s)
       for (const ChannelSamples& channel : channels) {
         const int sample = channel.at(long(spf) * frameIndex + s);
-        if (real) {
-          C3D::putFloat(p, float(sample + 32768), dec);
-          p += 4;
-        } else {
-          C3D::putU16LE(p, uint16_t(sample - 32768));
-          p += 2;
-        }
+        if (real)
+          reals[v++] = float(sample + 32768);
+        else
+          words[v++] = int16_t(uint16_t(sample - 32768));
       }
-    std::fwrite(buffer.data(), 1, frameSize, m_pFile);
+    uint8_t* p = block.data() + framesInBlock * frameSize;
+    if (real)
+      C3D::putFloats(p, reals.data(), frameValues, dec);
+    else
+      C3D::putWordsLE(p, words.data(), frameValues);
+    if (++framesInBlock == blockFrames) {
+      std::fwrite(block.data(), 1, framesInBlock * frameSize, m_pFile);
+      framesInBlock = 0;
+    }
     ++frameIndex;
     if (s_doProgress && frameIndex % 10 == 0) g_theOperationStack.stepTask();
     if (t > INT64_MAX - ticksPerFrame) break;
   }
+  if (framesInBlock > 0) std::fwrite(block.data(), 1, framesInBlock * frameSize, m_pFile);
 }

@@ -1,4 +1,7 @@
 #include "CsmExporter.h"
+#include "FixedDecimal.h"
+#include "MarkerCursor.h"
+#include "TextBlock.h"
 #include "plugin/host/Character.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/HInterface.h"
@@ -7,6 +10,7 @@
 #include "plugin/host/OperationStack.h"
 #include "plugin/host/SubjectManager.h"
 #include <algorithm>
+#include <charconv>
 #include <cstring>
 #include <ctime>
 #include <string>
@@ -153,21 +157,26 @@ void CsmExporter::writePoints() {
   for (const Module* pModule : m_modules)
     if (isWritten(pModule)) markers.push_back(static_cast<const Node*>(pModule));
 
-  // One line is formatted in memory and written in one call.
-  std::string line;
-  // Room for three of the widest "%.3f" numbers (about 313 characters each).
-  char text[1024];
+  std::vector<TrajectoryExport::MarkerCursor> cursors(markers.begin(), markers.end());
+  // Lines are formatted straight into one block, written in one call when it fills.
+  constexpr size_t kFrameNumberChars = 24; // "%lld"
+  TrajectoryExport::TextBlock block(
+      m_pFile, kFrameNumberChars + cursors.size() * 3 * (TrajectoryText::kFixedMaxChars + 2) + 1);
   for (int i = 0; i < frames; ++i) {
     const HTime t = m_timeRange.getStart() + i * ticksPerFrame;
-    int n = std::snprintf(text, sizeof text, "%lld", static_cast<long long>(t / ticksPerFrame));
-    line.assign(text, static_cast<size_t>(n));
-    for (const Node* pMarker : markers) {
-      const Vec3 p = pMarker->getWSPos(t);
-      n = std::snprintf(text, sizeof text, "  %.3f %.3f %.3f", p.x, p.y, p.z);
-      line.append(text, static_cast<size_t>(n));
+    char* p = block.lineStart();
+    p = std::to_chars(p, p + kFrameNumberChars, static_cast<long long>(t / ticksPerFrame)).ptr;
+    for (TrajectoryExport::MarkerCursor& cursor : cursors) {
+      cursor.advanceTo(t);
+      const Vec3 position = cursor.position(t);
+      *p++ = ' ';
+      for (const double value : {position.x, position.y, position.z}) {
+        *p++ = ' ';
+        p = TrajectoryText::formatFixed<3>(p, value);
+      }
     }
-    line += '\n';
-    std::fwrite(line.data(), 1, line.size(), m_pFile);
+    *p++ = '\n';
+    block.lineEnd(p);
     if (s_doProgress && i % 10 == 0) g_theOperationStack.stepTask();
   }
 }

@@ -1,4 +1,7 @@
 #include "TrcExporter.h"
+#include "FixedDecimal.h"
+#include "MarkerCursor.h"
+#include "TextBlock.h"
 #include "c3d/PrintableText.h"
 #include "plugin/host/Character.h"
 #include "plugin/host/Database.h"
@@ -6,46 +9,37 @@
 #include "plugin/host/HTimeManager.h"
 #include "plugin/host/Marker.h"
 #include "plugin/host/OperationStack.h"
+#include <charconv>
 #include <cmath>
 #include <cstring>
 #include <string>
+#include <vector>
 
 namespace {
 const char* const kSection = "TRCExporter";
 
-// Appends "\t%f" of a value in full: a double printed with six decimals takes up to 317
-// characters (309 digits before the point), so the buffer is sized for that, and a longer
-// result (which cannot happen) is formatted again into a buffer of its size.
-void appendValue(std::string& io_rLine, double i_value) {
-  char text[384];
-  const int n = std::snprintf(text, sizeof text, "\t%f", i_value);
-  if (n < 0) return;
-  if (size_t(n) < sizeof text) {
-    io_rLine.append(text, size_t(n));
-    return;
-  }
-  std::string wide(size_t(n) + 1, '\0');
-  std::snprintf(wide.data(), wide.size(), "\t%f", i_value);
-  io_rLine.append(wide.data(), size_t(n));
-}
+// Characters of the frame number column ("%d" of an int).
+constexpr size_t kFrameNumberChars = 12;
 
-// Appends one "\t%f\t%f\t%f" triple, or the three tabs of a gap. A node that is not a marker
-// has a value at every time. A position with an infinite or NaN coordinate is written as a gap:
-// such text ("inf", "nan") is no coordinate to other readers of the format.
-void appendPosition(std::string& io_rLine, const Node* i_pNode, HTime i_t) {
-  if (i_pNode->isKindOf(&Marker::s_classMarker) &&
-      !static_cast<const Marker*>(i_pNode)->m_track.hasKeyAt(i_t)) {
-    io_rLine += "\t\t\t";
-    return;
+// Writes one "\t%f\t%f\t%f" triple, or the three tabs of a gap; returns the end. A node that
+// is not a marker has a value at every time. A position with an infinite or NaN coordinate is
+// written as a gap: such text ("inf", "nan") is no coordinate to other readers of the format.
+char* appendPosition(char* o_p, TrajectoryExport::MarkerCursor& io_rCursor, HTime i_t) {
+  io_rCursor.advanceTo(i_t);
+  if (io_rCursor.isMarker() && !io_rCursor.hasKeyAt(i_t)) {
+    std::memcpy(o_p, "\t\t\t", 3);
+    return o_p + 3;
   }
-  const Vec3 p = i_pNode->getWSPos(i_t);
+  const Vec3 p = io_rCursor.position(i_t);
   if (!std::isfinite(p.x) || !std::isfinite(p.y) || !std::isfinite(p.z)) {
-    io_rLine += "\t\t\t";
-    return;
+    std::memcpy(o_p, "\t\t\t", 3);
+    return o_p + 3;
   }
-  appendValue(io_rLine, p.x);
-  appendValue(io_rLine, p.y);
-  appendValue(io_rLine, p.z);
+  for (const double value : {p.x, p.y, p.z}) {
+    *o_p++ = '\t';
+    o_p = TrajectoryText::formatFixed<6>(o_p, value);
+  }
+  return o_p;
 }
 } // namespace
 
@@ -173,20 +167,28 @@ void TrcExporter::writeFrames() {
   const double rate = 135000000.0 / double(ticksPerFrame);
   const double step = 1.0 / rate;
 
+  std::vector<TrajectoryExport::MarkerCursor> cursors;
+  cursors.reserve(size_t(m_markers.getCount() + m_extraNodes.getCount()));
+  for (const Node* pNode : m_markers)
+    cursors.emplace_back(pNode);
+  for (const Node* pNode : m_extraNodes)
+    cursors.emplace_back(pNode);
+
   if (s_doProgress) g_theOperationStack.setTaskRange(0, frames / 10);
-  std::string line;
+  TrajectoryExport::TextBlock block(
+      m_pFile, kFrameNumberChars + TrajectoryText::kFixedMaxChars +
+                   cursors.size() * 3 * (TrajectoryText::kFixedMaxChars + 1) + 2);
   for (int i = 0; i < frames; ++i) {
     const HTime t = t0 + i * ticksPerFrame;
     const int frame = pTime->getFrame(t);
-    char text[64];
-    const int n = std::snprintf(text, sizeof text, "%d\t%f", frame, frame * step);
-    line.assign(text, n > 0 ? static_cast<size_t>(n) : 0);
-    for (const Node* pNode : m_markers)
-      appendPosition(line, pNode, t);
-    for (const Node* pNode : m_extraNodes)
-      appendPosition(line, pNode, t);
-    std::fprintf(m_pFile, "%s", line.c_str());
-    std::fprintf(m_pFile, "\n");
+    char* p = block.lineStart();
+    p = std::to_chars(p, p + kFrameNumberChars, frame).ptr;
+    *p++ = '\t';
+    p = TrajectoryText::formatFixed<6>(p, frame * step);
+    for (TrajectoryExport::MarkerCursor& cursor : cursors)
+      p = appendPosition(p, cursor, t);
+    *p++ = '\n';
+    block.lineEnd(p);
     if (s_doProgress && i % 10 == 0) g_theOperationStack.stepTask();
   }
 }

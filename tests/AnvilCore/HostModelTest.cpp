@@ -2,9 +2,13 @@
 #include "../support/HostFixture.h"
 #include "plugin/host/HString.h"
 #include "plugin/host/TSimpleArray.h"
+#include <algorithm>
 #include <cmath>
 #include <cstring>
 #include <gtest/gtest.h>
+#include <map>
+#include <random>
+#include <vector>
 
 using namespace HostTest;
 
@@ -201,4 +205,97 @@ TEST(HostClock, TicksFramesAndRanges) {
   pTime->setFrameRate(-5.0); // refused: the rate stays
   EXPECT_EQ(pTime->getTicksPerFrame(), 4504500);
   pTime->setFrameRate(120.0);
+}
+
+// Tracks keep their times as runs of evenly spaced keys: every query must answer as a plain
+// sorted list of times would, whatever the order and spacing of the keys set.
+TEST(HostTracks, RunsAnswerAsASortedListOfTimes) {
+  std::mt19937 gen(3);
+  for (int round = 0; round < 200; ++round) {
+    HVec3Track track;
+    std::map<HTime, double> reference;
+    const int keys = int(gen() % 60);
+    for (int k = 0; k < keys; ++k) {
+      // Mostly a regular grid with gaps, sometimes a time off the grid or before the others.
+      HTime t = HTime(k) * 100 + (gen() % 7 == 0 ? HTime(gen() % 90) : 0);
+      if (gen() % 9 == 0) t = HTime(gen() % 6000) - 50;
+      if (gen() % 5 == 0) continue;
+      const double value = double(gen() % 1000);
+      track.setKey(t, Vec3(value, 0, 0));
+      reference[t] = value;
+    }
+    std::vector<HTime> times;
+    for (const auto& [t, value] : reference)
+      times.push_back(t);
+    ASSERT_EQ(track.getNumKeys(), int(times.size()));
+    ASSERT_EQ(track.times(), times);
+    HVec3Track::KeyCursor cursor(track);
+    for (size_t i = 0; i < times.size(); ++i, cursor.next()) {
+      ASSERT_EQ(track.getKeyTime(int(i)), times[i]);
+      ASSERT_EQ(track.getKeyValue(int(i)).x, reference[times[i]]);
+      ASSERT_EQ(cursor.time(), times[i]);
+      ASSERT_EQ(cursor.index(), int(i));
+    }
+    EXPECT_TRUE(cursor.atEnd());
+    for (HTime t = -120; t < 6100; t += 7) {
+      const auto lower = std::lower_bound(times.begin(), times.end(), t);
+      ASSERT_EQ(track.lowerBound(t), size_t(lower - times.begin())) << t;
+      const bool exact = lower != times.end() && *lower == t;
+      ASSERT_EQ(track.findKey(t), exact ? int(lower - times.begin()) : -1);
+      int first = -1;
+      const auto upper = std::upper_bound(times.begin(), times.end(), t + 150);
+      ASSERT_EQ(track.countInRange(t, t + 150, first), int(upper - lower));
+      ASSERT_EQ(first, int(lower - times.begin()));
+      if (times.empty()) continue;
+      // Interpolation between the neighbours of t, held outside the keys.
+      double expected;
+      if (t <= times.front())
+        expected = reference[times.front()];
+      else if (t >= times.back())
+        expected = reference[times.back()];
+      else if (exact)
+        expected = reference[t];
+      else {
+        const HTime lo = *(lower - 1), hi = *lower;
+        const double u = double(t - lo) / double(hi - lo);
+        expected = HVec3Lerp()(Vec3(reference[lo], 0, 0), Vec3(reference[hi], 0, 0), u).x;
+      }
+      ASSERT_EQ(track.evaluate(t, Vec3()).x, expected) << t;
+    }
+  }
+  // Times far apart, near the ends of the clock, stay exact.
+  HVec3Track wide;
+  wide.setKey(INT64_MIN + 1, Vec3(1, 0, 0));
+  wide.setKey(0, Vec3(2, 0, 0));
+  wide.setKey(INT64_MAX - 1, Vec3(3, 0, 0));
+  EXPECT_EQ(wide.times(), (std::vector<HTime>{INT64_MIN + 1, 0, INT64_MAX - 1}));
+  EXPECT_EQ(wide.findKey(INT64_MAX - 1), 2);
+  int first = -1;
+  EXPECT_EQ(wide.countInRange(1, INT64_MAX, first), 1);
+}
+
+// Appending keys in one step builds the track that setting them one by one builds, also when a
+// batch holds times out of order or before the last key.
+TEST(HostTracks, AppendingKeysMatchesSettingThem) {
+  std::mt19937 gen(8);
+  for (int round = 0; round < 100; ++round) {
+    HVec3Track appended, set;
+    HTime t = HTime(gen() % 50);
+    for (int batch = 0; batch < 5; ++batch) {
+      std::vector<HTime> times;
+      std::vector<Vec3> values;
+      const int count = int(gen() % 20);
+      for (int k = 0; k < count; ++k) {
+        t += gen() % 4 == 0 ? HTime(gen() % 300) + 1 : 100;
+        times.push_back(gen() % 25 == 0 ? HTime(gen() % 2000) : t);
+        values.push_back(Vec3(double(gen() % 100), double(k), double(batch)));
+      }
+      appended.appendKeys(times.data(), values.data(), times.size());
+      for (size_t k = 0; k < times.size(); ++k)
+        set.setKey(times[k], values[k]);
+    }
+    ASSERT_EQ(appended.times(), set.times());
+    for (int i = 0; i < set.getNumKeys(); ++i)
+      ASSERT_EQ(appended.getKeyValue(i), set.getKeyValue(i));
+  }
 }

@@ -36,6 +36,9 @@ TEST(PluginEntry, ApiAndPluginObjects) {
   auto* pCommands = static_cast<CommandPluginBase*>(pSecond);
   EXPECT_TRUE(pCommands->loadCommands());
   EXPECT_TRUE(pCommands->unloadCommands());
+  // The commands belong to whoever loaded them, as the exporters do.
+  for (int i = 0; i < pCommands->getNumCommands(); ++i)
+    pCommands->getCommand(i)->unref();
   pSecond->deleteThis();
 }
 

@@ -52,7 +52,7 @@ std::vector<uint8_t> C3DTestFile::real(float i_value) const {
 void C3DTestFile::fillLinear(int i_points, int i_frames) {
   labels.clear();
   for (int p = 0; p < i_points; ++p)
-    labels.push_back("M" + std::to_string(p + 1));
+    labels.push_back(std::string("M").append(std::to_string(p + 1)));
   frames.assign(size_t(i_frames), std::vector<std::array<float, 4>>(size_t(i_points)));
   for (int f = 0; f < i_frames; ++f)
     for (int p = 0; p < i_points; ++p)

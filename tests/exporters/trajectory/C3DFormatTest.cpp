@@ -38,3 +38,31 @@ TEST(C3DFormatTest, DecConversionMatchesTheFormatBothWays) {
   const uint8_t mips[4] = {0x3F, 0x80, 0x00, 0x00};
   EXPECT_EQ(C3D::getFloat(mips, C3D::EProcessorMips), 1.0f);
 }
+
+// The array conversions the frame writer uses give the bytes of the one-value conversions, for
+// any bit pattern: zeros of both signs, denormals, the exponents whose DEC byte wraps, NaNs.
+TEST(C3DFormatTest, ArrayConversionsMatchOneValueConversions) {
+  std::mt19937 gen(11);
+  std::vector<float> values = {0.0f,
+                               -0.0f,
+                               1.0f,
+                               -1.0f,
+                               C3D::bitsFloat(0x7F800000u),
+                               C3D::bitsFloat(0xFF7FFFFFu),
+                               C3D::bitsFloat(0x00000001u),
+                               C3D::bitsFloat(0x7FC00000u)};
+  for (int i = 0; i < 100000; ++i)
+    values.push_back(C3D::bitsFloat(uint32_t(gen())));
+  for (const bool dec : {false, true}) {
+    std::vector<uint8_t> together(4 * values.size()), single(4 * values.size());
+    C3D::putFloats(together.data(), values.data(), values.size(), dec);
+    for (size_t i = 0; i < values.size(); ++i)
+      C3D::putFloat(&single[4 * i], values[i], dec);
+    ASSERT_EQ(together, single) << (dec ? "DEC" : "Intel");
+  }
+  std::vector<int16_t> words = {0, -1, 32767, -32768, 0x1234};
+  std::vector<uint8_t> bytes(2 * words.size());
+  C3D::putWordsLE(bytes.data(), words.data(), words.size());
+  EXPECT_EQ(std::string(bytes.begin(), bytes.end()),
+            std::string("\x00\x00\xFF\xFF\xFF\x7F\x00\x80\x34\x12", 10));
+}
