@@ -5,6 +5,7 @@
 #include "AllocationCounter.h"
 #include "AnvilCore/ExportDriver.h"
 #include "LongTake.h"
+#include "RatioReporter.h"
 #include "exporters/trajectory/C3DExporter.h"
 #include "plugin/host/Database.h"
 #include "plugin/host/HTimeManager.h"
@@ -84,27 +85,6 @@ void BM_PlainFwrite(benchmark::State& state) {
   std::filesystem::remove(path);
 }
 
-// Keeps the mean time of each run so that the ratios can be printed at the end.
-class RatioReporter : public benchmark::ConsoleReporter {
-public:
-  void ReportRuns(const std::vector<Run>& i_runs) override {
-    for (const Run& run : i_runs)
-      m_seconds[run.benchmark_name()] = run.GetAdjustedRealTime();
-    ConsoleReporter::ReportRuns(i_runs);
-  }
-  void printRatios() const {
-    for (const char* pForm : {"0", "1"}) {
-      const auto exported = m_seconds.find(std::string("BM_C3DExport/") + pForm);
-      const auto floor = m_seconds.find(std::string("BM_PlainFwrite/") + pForm);
-      if (exported == m_seconds.end() || floor == m_seconds.end()) continue;
-      std::printf("C3D %s export / plain fwrite of the same bytes: %.2f\n",
-                  pForm[0] == '1' ? "float" : "integer", exported->second / floor->second);
-    }
-  }
-
-private:
-  std::map<std::string, double> m_seconds;
-};
 } // namespace
 
 // Each export runs before its floor, which needs the export's file size.
@@ -113,9 +93,12 @@ BENCHMARK(BM_PlainFwrite)->Arg(1)->Arg(0)->Unit(benchmark::kMillisecond);
 
 int main(int argc, char** argv) {
   benchmark::Initialize(&argc, argv);
-  RatioReporter reporter;
+  Bench::RatioReporter reporter;
   benchmark::RunSpecifiedBenchmarks(&reporter);
-  reporter.printRatios();
+  reporter.printRatio("C3D float export / plain fwrite of the same bytes", "BM_C3DExport/1",
+                      "BM_PlainFwrite/1");
+  reporter.printRatio("C3D integer export / plain fwrite of the same bytes", "BM_C3DExport/0",
+                      "BM_PlainFwrite/0");
   benchmark::Shutdown();
   return 0;
 }

@@ -6,6 +6,7 @@
 // same number of iterations, so that a moment of load on the shared machine weighs alike.
 #include "AnvilCore/ExportDriver.h"
 #include "LongTake.h"
+#include "RatioReporter.h"
 #include "exporters/scene/AnvilFbxExporter.h"
 #include "plugin/host/SolvingBone.h"
 #include "plugin/host/SolvingSetup.h"
@@ -124,25 +125,6 @@ void BM_PlainFwrite(benchmark::State& state) {
   std::filesystem::remove(path);
 }
 
-class RatioReporter : public benchmark::ConsoleReporter {
-public:
-  void ReportRuns(const std::vector<Run>& i_runs) override {
-    for (const Run& run : i_runs)
-      m_seconds[run.benchmark_name()] = run.GetAdjustedRealTime();
-    ConsoleReporter::ReportRuns(i_runs);
-  }
-  void printRatios() const {
-    const auto exported = m_seconds.find("BM_FbxExport/iterations:3");
-    const auto floor = m_seconds.find("BM_PlainFwrite/iterations:3");
-    if (exported != m_seconds.end() && floor != m_seconds.end())
-      std::printf("FBX export / plain fwrite of the same bytes: %.2f\n",
-                  exported->second / floor->second);
-    std::printf("FBX export peak memory / key data held: %.2f\n", s_memoryRatio);
-  }
-
-private:
-  std::map<std::string, double> m_seconds;
-};
 } // namespace
 
 BENCHMARK(BM_FbxExport)->Unit(benchmark::kMillisecond)->Iterations(3);
@@ -150,9 +132,11 @@ BENCHMARK(BM_PlainFwrite)->Unit(benchmark::kMillisecond)->Iterations(3);
 
 int main(int argc, char** argv) {
   benchmark::Initialize(&argc, argv);
-  RatioReporter reporter;
+  Bench::RatioReporter reporter;
   benchmark::RunSpecifiedBenchmarks(&reporter);
-  reporter.printRatios();
+  reporter.printRatio("FBX export / plain fwrite of the same bytes", "BM_FbxExport/iterations:3",
+                      "BM_PlainFwrite/iterations:3");
+  std::printf("FBX export peak memory / key data held: %.2f\n", s_memoryRatio);
   benchmark::Shutdown();
   return 0;
 }

@@ -9,6 +9,7 @@
 #include "Flow2/Flow2Types/IFlowState.h"
 #include "Flow2/Flow2Types/VFlowItem.h"
 
+#include "RatioReporter.h"
 #include <benchmark/benchmark.h>
 
 #include <array>
@@ -279,27 +280,6 @@ void ReportAllocations() {
     std::printf("allocations per frame after warm-up: %.4f\n", double(allocations) / StreamFrames);
 }
 
-class RatioReporter : public benchmark::ConsoleReporter {
-public:
-  void ReportRuns(const std::vector<Run>& i_runs) override {
-    for (const Run& run : i_runs)
-      m_Seconds[run.benchmark_name()] = run.GetAdjustedRealTime();
-    ConsoleReporter::ReportRuns(i_runs);
-  }
-  void PrintRatio() const {
-    const auto store = m_Seconds.find("BM_FlowStoreFrame");
-    const auto single = m_Seconds.find("BM_FlowStoreFrameSingle");
-    const auto floor = m_Seconds.find("BM_MakeSharedFrame");
-    if (store == m_Seconds.end() || single == m_Seconds.end() || floor == m_Seconds.end()) return;
-    std::printf("Flow store item / make_shared: %.2f\n", store->second / floor->second);
-    std::printf("Flow store item, one CreateItem each / make_shared: %.2f\n",
-                single->second / floor->second);
-  }
-
-private:
-  std::map<std::string, double> m_Seconds;
-};
-
 } // namespace
 
 BENCHMARK(BM_FlowStoreFrame)->Unit(benchmark::kMicrosecond);
@@ -309,9 +289,11 @@ BENCHMARK(BM_MakeSharedFrame)->Unit(benchmark::kMicrosecond);
 int main(int argc, char** argv) {
   ReportAllocations();
   benchmark::Initialize(&argc, argv);
-  RatioReporter reporter;
+  Bench::RatioReporter reporter;
   benchmark::RunSpecifiedBenchmarks(&reporter);
-  reporter.PrintRatio();
+  reporter.printRatio("Flow store item / make_shared", "BM_FlowStoreFrame", "BM_MakeSharedFrame");
+  reporter.printRatio("Flow store item, one CreateItem each / make_shared",
+                      "BM_FlowStoreFrameSingle", "BM_MakeSharedFrame");
   benchmark::Shutdown();
   return 0;
 }
