@@ -4,6 +4,7 @@
 // (8-byte time, 4-byte value and 4-byte flags per key; the layer itself holds less, as the three
 // curves of a property share their times and flags are kept as runs). Both benchmarks run the
 // same number of iterations, so that a moment of load on the shared machine weighs alike.
+#include "AllocationCounter.h"
 #include "AnvilCore/ExportDriver.h"
 #include "LongTake.h"
 #include "RatioReporter.h"
@@ -20,43 +21,6 @@
 #include <map>
 #include <new>
 #include <vector>
-
-// Allocation accounting for the memory ratio: bytes live now and the peak since the last reset.
-namespace {
-std::atomic<int64_t> s_live{0};
-std::atomic<int64_t> s_peak{0};
-void noteAllocation(void* i_p) {
-  if (!i_p) return;
-  const int64_t now = s_live += int64_t(malloc_usable_size(i_p));
-  int64_t peak = s_peak.load();
-  while (now > peak && !s_peak.compare_exchange_weak(peak, now)) {
-  }
-}
-} // namespace
-
-void* operator new(size_t i_size) {
-  void* p = std::malloc(i_size ? i_size : 1);
-  if (!p) throw std::bad_alloc();
-  noteAllocation(p);
-  return p;
-}
-void operator delete(void* i_p) noexcept {
-  if (!i_p) return;
-  s_live -= int64_t(malloc_usable_size(i_p));
-  std::free(i_p); // every operator new of this program allocates with malloc
-}
-void operator delete(void* i_p, size_t) noexcept {
-  operator delete(i_p);
-}
-void* operator new[](size_t i_size) {
-  return operator new(i_size);
-}
-void operator delete[](void* i_p) noexcept {
-  operator delete(i_p);
-}
-void operator delete[](void* i_p, size_t) noexcept {
-  operator delete(i_p);
-}
 
 namespace {
 using namespace Bench;
@@ -99,11 +63,10 @@ void BM_FbxExport(benchmark::State& state) {
   request.path = tempOutput(".fbx");
   std::string error;
   for (auto _ : state) {
-    const int64_t before = s_live.load();
-    s_peak = before;
+    const PeakAllocation peak;
     if (AnvilCore::runExport(*pExporter, request, error) != AnvilCore::EExportStatus::EOk)
       state.SkipWithError(error.c_str());
-    s_memoryRatio = double(s_peak.load() - before) / double(heldKeyBytes());
+    s_memoryRatio = double(peak.bytes()) / double(heldKeyBytes());
   }
   s_bytes = std::filesystem::file_size(request.path);
   state.SetBytesProcessed(int64_t(state.iterations()) * int64_t(s_bytes));
