@@ -79,13 +79,23 @@ AnvilRotation postRotation(const Node* i_pNode) {
 MarkerSpace::MarkerSpace(const Node* i_pFbxParentHost)
     : m_pParent(i_pFbxParentHost), m_scene(sceneRotation()) {
   m_static = !m_pParent || !movesAbove(m_pParent);
-  if (m_pParent && m_static) m_inverse = inverse(worldOf(m_pParent));
+  m_identity = !m_pParent && !g_db->isSceneRotated();
+  if (!m_static) return;
+  const Frame toParent = m_pParent ? inverse(worldOf(m_pParent)) : Frame{};
+  (toParent.m_rotation * m_scene).getMatrix(m_matrix);
+  m_offset = toParent.m_translation;
 }
 
 Vec3 MarkerSpace::local(const Vec3& i_rTrackValue, long long i_time) const {
+  if (m_identity) return i_rTrackValue;
+  if (m_static) {
+    const double* m = m_matrix;
+    const Vec3& v = i_rTrackValue;
+    return Vec3(m[0] * v.x + m[1] * v.y + m[2] * v.z + m_offset.x,
+                m[3] * v.x + m[4] * v.y + m[5] * v.z + m_offset.y,
+                m[6] * v.x + m[7] * v.y + m[8] * v.z + m_offset.z);
+  }
   const Vec3 world = m_scene.rotate(i_rTrackValue);
-  if (!m_pParent) return world;
-  if (m_static) return m_inverse.apply(world);
   return inverse(Frame{m_pParent->getWSRot(i_time), m_pParent->getWSPos(i_time)}).apply(world);
 }
 

@@ -43,8 +43,11 @@ public:
 private:
   const Node* m_pParent;
   bool m_static = true;
-  Frame m_inverse; // world to parent, when static
+  bool m_identity = false; // no parent and no scene rotation: track values as they are
   AnvilRotation m_scene;
+  // Scene rotation and world-to-parent folded into one row-major matrix and offset, when static.
+  double m_matrix[9] = {1, 0, 0, 0, 1, 0, 0, 0, 1};
+  Vec3 m_offset;
 };
 
 } // namespace FbxTransforms
