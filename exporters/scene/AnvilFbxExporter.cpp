@@ -1,4 +1,5 @@
 #include "AnvilFbxExporter.h"
+#include "UpAxisText.h"
 #include "fbx/FbxObject.h"
 #include "plugin/host/HInterface.h"
 #include "plugin/host/HTimeManager.h"
@@ -135,29 +136,11 @@ double AnvilFbxExporter::getCompatibleFrameRate(uint64_t i_index) {
 }
 
 bool AnvilFbxExporter::setDesiredUpAxis(const HString& i_rAxis) {
-  HString axis = i_rAxis;
-  axis.MakeLower();
-  if (axis == "scene")
-    m_options.m_desiredUpAxis = FbxExportOptions::EUpAxisScene;
-  else if (axis == "y")
-    m_options.m_desiredUpAxis = FbxExportOptions::EUpAxisY;
-  else if (axis == "z")
-    m_options.m_desiredUpAxis = FbxExportOptions::EUpAxisZ;
-  else
-    return false;
-  return true;
+  return SceneUpAxis::parse(i_rAxis, m_options.m_desiredUpAxis);
 }
 
 HString AnvilFbxExporter::getDesiredUpAxisAsString() const {
-  switch (m_options.m_desiredUpAxis) {
-  case FbxExportOptions::EUpAxisScene:
-    return "Scene";
-  case FbxExportOptions::EUpAxisY:
-    return "Y";
-  case FbxExportOptions::EUpAxisZ:
-    return "Z";
-  }
-  return HString();
+  return SceneUpAxis::text(m_options.m_desiredUpAxis);
 }
 
 bool AnvilFbxExporter::setNamespaceMode(const HString& i_rMode) {

@@ -1,4 +1,5 @@
 #include "USDExporter.h"
+#include "UpAxisText.h"
 
 #include "plugin/host/Character.h"
 #include "plugin/host/Database.h"
@@ -109,29 +110,11 @@ bool USDExporter::recognize(const HString& i_rFilename) {
 }
 
 bool USDExporter::setDesiredUpAxis(const HString& i_rAxis) {
-  HString axis = i_rAxis;
-  axis.MakeLower();
-  if (axis == "scene")
-    m_options.m_desiredUpAxis = UsdExportOptions::EUpAxisScene;
-  else if (axis == "y")
-    m_options.m_desiredUpAxis = UsdExportOptions::EUpAxisY;
-  else if (axis == "z")
-    m_options.m_desiredUpAxis = UsdExportOptions::EUpAxisZ;
-  else
-    return false;
-  return true;
+  return SceneUpAxis::parse(i_rAxis, m_options.m_desiredUpAxis);
 }
 
 HString USDExporter::getDesiredUpAxisAsString() const {
-  switch (m_options.m_desiredUpAxis) {
-  case UsdExportOptions::EUpAxisScene:
-    return "Scene";
-  case UsdExportOptions::EUpAxisY:
-    return "Y";
-  case UsdExportOptions::EUpAxisZ:
-    return "Z";
-  }
-  return HString();
+  return SceneUpAxis::text(m_options.m_desiredUpAxis);
 }
 
 void USDExporter::loadUserSetup() {
