@@ -201,7 +201,10 @@ bool AddRigidBodyImpl(TSubject& io_rSubject, VSubjectApplicationData& io_rAppDat
 template <class T> void EraseIndices(std::vector<T>& items, const std::vector<bool>& remove) {
   std::size_t out = 0;
   for (std::size_t i = 0; i < items.size(); ++i)
-    if (!remove[i]) items[out++] = std::move(items[i]);
+    if (!remove[i]) {
+      if (out != i) items[out] = std::move(items[i]);
+      ++out;
+    }
   items.resize(out);
 }
 
