@@ -10,6 +10,24 @@ using CoreOstraTypes::VSubjectParametrised;
 
 #define UTILS_LOG(...) ZMT_LOG(SubjectUtilsChannel, ZMT::ELogError, __VA_ARGS__)
 
+namespace {
+
+/// Covariance size of the Gaussian target types; 0 for the others.
+std::size_t GaussianCovarianceSize(CoreOstraTypes::VTargetTypeBase::ETargetType type) {
+  switch (type) {
+  case CoreOstraTypes::VTargetTypeBase::ELocalPointToWorldPointGaussian:
+    return 9;
+  case CoreOstraTypes::VTargetTypeBase::ELocalPlaneToWorldPointGaussian:
+    return 1;
+  case CoreOstraTypes::VTargetTypeBase::ELocalLineToWorldPointGaussian:
+    return 4;
+  default:
+    return 0;
+  }
+}
+
+} // namespace
+
 bool VSubjectEvaluator::SetSubject(const VSubjectParametrised& subject, EParameterValues start) {
   m_Subject = subject;
   if (start == EParameterValues::EPrior) {
@@ -69,8 +87,19 @@ bool VSubjectEvaluator::EvaluateSegment(const VSubjectParametrised::VSegment& in
   out.m_Joint.m_Name = joint.m_Name;
   out.m_Joint.m_JointType = joint.m_JointType;
   out.m_Joint.m_JointOrientation = joint.m_JointOrientation;
-  out.m_Joint.m_Covariance = joint.m_Covariance;
-  out.m_Joint.m_Mean = joint.m_Mean;
+  // No statistics on the record means no information: a zero mean and an all-zero covariance
+  // of the joint's size.
+  const std::size_t n = CoreOstraTypes::JointParameterCount(joint.m_JointType);
+  if (joint.m_Covariance.empty()) {
+    out.m_Joint.m_Covariance.assign(n * n, 0.0);
+  } else {
+    out.m_Joint.m_Covariance = joint.m_Covariance;
+  }
+  if (joint.m_Mean.empty()) {
+    out.m_Joint.m_Mean.assign(n, 0.0);
+  } else {
+    out.m_Joint.m_Mean = joint.m_Mean;
+  }
   out.m_Joint.m_RangeCentringState = joint.m_RangeCentringState;
   out.m_Joint.m_RangeMatrix = joint.m_RangeMatrix;
 
@@ -100,6 +129,7 @@ bool VSubjectEvaluator::EvaluateTarget(const VSubjectParametrised::VTarget& in,
   out.m_RotationObservationIndices = in.m_RotationObservationIndices;
   out.m_SegmentIndices = in.m_SegmentIndices;
   out.m_Covariance = in.m_Covariance;
+  if (out.m_Covariance.empty()) out.m_Covariance.assign(GaussianCovarianceSize(in.m_Type), 0.0);
   out.m_ViewNormals = in.m_ViewNormals;
 
   bool ok = true;

@@ -18,6 +18,9 @@ inline constexpr const char* SubjectUtilsChannel = "SubjectUtils";
 /// Which of its own values a subject's dynamic parameters start from.
 enum class EParameterValues { EValue, EPrior };
 
+/// A joint without mean or covariance evaluates to zeros of its parameter count (an all-zero
+/// covariance is "no information"), and so does an empty covariance of a Gaussian target.
+///
 /// Evaluates one parametrised subject repeatedly: the static parameters are parsed once, then
 /// each Evaluate takes the current dynamic parameter values. Not thread-safe; one per thread.
 class VSubjectEvaluator {

@@ -283,3 +283,22 @@ TEST(SubjectParametrisedCheck, TargetTemplateRules) {
                           "type expects size 0",
                           "Target 5, invalid weights or template values"));
 }
+
+TEST(SubjectEvaluation, MissingStatisticsBecomeZerosOfTheRightSize) {
+  auto valid = MakeValidSubject();
+  auto& s = valid.m_Subject;
+  s.m_Segments[1].m_Joint.m_Mean.clear();
+  s.m_Segments[1].m_Joint.m_Covariance.clear();
+  s.m_Segments[2].m_Joint.m_Mean = {0.5, 1}; // wrong, and kept so that the check sees it
+  s.m_Targets[1].m_Covariance.clear();
+  VSubject solved;
+  ASSERT_TRUE(SubjectFromParametrised(s, solved));
+  EXPECT_EQ(solved.m_Segments[1].m_Joint.m_Mean, std::vector<double>(3, 0.0));
+  EXPECT_EQ(solved.m_Segments[1].m_Joint.m_Covariance, std::vector<double>(9, 0.0));
+  EXPECT_EQ(solved.m_Segments[3].m_Joint.m_Covariance.size(), 0u); // dummy
+  EXPECT_EQ(solved.m_Targets[1].m_Covariance, std::vector<double>(9, 0.0));
+  EXPECT_EQ(solved.m_Targets[0].m_Covariance.size(), 0u); // not Gaussian
+  ZMT::VLogCapture capture;
+  EXPECT_FALSE(SubjectCheck(solved));
+  EXPECT_THAT(capture.Messages(SubjectCheckChannel), ElementsAre("Incorrent 'Mean' vector size."));
+}
