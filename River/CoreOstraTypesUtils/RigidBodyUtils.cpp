@@ -2,6 +2,7 @@
 
 #include "DebugServices/AssertFail.h"
 #include "DebugServices/GlobalLog.h"
+#include "River/CoreOstraTypesUtils/AngleAxis.h"
 #include "River/CoreOstraTypesUtils/ExpressionNumber.h"
 
 #include <algorithm>
@@ -390,6 +391,94 @@ bool WriteRigidBodyMarkers(VSubject::VTarget& io_rTarget,
   const auto normals = io_rTarget.m_ViewNormals;
   return WriteRigidBody(io_rTarget, orientation, position, markerPositions, markerCovariances,
                         normals);
+}
+
+bool ConvertToRigidBodyTarget(VSubject& io_rSubject) {
+  if (!IsRigidBodyImpl(io_rSubject)) {
+    RIGID_ERROR("Invalid input, subject %1% is not a rigid body!", io_rSubject.m_Name);
+    return false;
+  }
+  auto& targets = io_rSubject.m_Targets;
+  if (targets.size() == 1 && targets[0].m_Type == VTargetTypeBase::ERigidBody) {
+    RIGID_LOG(ZMT::ELogInfo, "No conversion needed for subject %1%!", io_rSubject.m_Name);
+    return true;
+  }
+  const bool points = std::all_of(targets.begin(), targets.end(), [](const auto& t) {
+    return (t.m_Type == VTargetTypeBase::ELocalPointToWorldPoint ||
+            t.m_Type == VTargetTypeBase::ELocalPointToWorldPointGaussian) &&
+           t.m_MarkerIndices.size() == 1 && t.m_State.size() == 3;
+  });
+  if (targets.size() < 3 || !points) {
+    RIGID_ERROR("Invalid number of targets for subject %1%", io_rSubject.m_Name);
+    return false;
+  }
+  VSubject::VTarget body;
+  body.m_Type = VTargetTypeBase::ERigidBody;
+  body.m_SegmentIndices = {0};
+  body.m_Weight = targets[0].m_Weight;
+  std::vector<RigidVector> positions;
+  std::vector<RigidCovariance> covariances;
+  std::vector<RigidVector> normals;
+  bool anyNormal = false;
+  for (const auto& t : targets) {
+    body.m_MarkerIndices.push_back(t.m_MarkerIndices[0]);
+    positions.push_back({t.m_State[0], t.m_State[1], t.m_State[2]});
+    RigidCovariance covariance{};
+    if (t.m_Covariance.size() == 9) std::copy_n(t.m_Covariance.begin(), 9, covariance.begin());
+    covariances.push_back(covariance);
+    normals.push_back(t.m_ViewNormals.empty() ? RigidVector{} : t.m_ViewNormals[0]);
+    anyNormal = anyNormal || !t.m_ViewNormals.empty();
+  }
+  if (!anyNormal) normals.clear();
+  if (!WriteRigidBody(body, {0, 0, 0}, {0, 0, 0}, positions, covariances, normals)) return false;
+  targets = {body};
+  return true;
+}
+
+bool ConvertToPointTargets(VSubject& io_rSubject) {
+  if (!IsRigidBodyImpl(io_rSubject)) {
+    RIGID_ERROR("Invalid input, subject %1% is not a rigid body!", io_rSubject.m_Name);
+    return false;
+  }
+  auto& targets = io_rSubject.m_Targets;
+  if (targets[0].m_Type != VTargetTypeBase::ERigidBody) {
+    RIGID_LOG(ZMT::ELogInfo, "No conversion needed for subject %1%!", io_rSubject.m_Name);
+    return true;
+  }
+  if (targets.size() != 1) {
+    RIGID_ERROR("Invalid number of targets for subject %1%", io_rSubject.m_Name);
+    return false;
+  }
+  const auto& body = targets[0];
+  RigidVector orientation{}, position{};
+  std::vector<RigidVector> positions;
+  std::vector<RigidCovariance> covariances;
+  if (!ReadRigidBodyInformation(body, orientation, position, positions, covariances)) return false;
+  const VPose offset = PoseFromAngleAxis(orientation, position);
+  std::vector<VSubject::VTarget> points;
+  for (std::size_t i = 0; i < positions.size(); ++i) {
+    VSubject::VTarget point;
+    point.m_Type = VTargetTypeBase::ELocalPointToWorldPointGaussian;
+    point.m_Weight = body.m_Weight;
+    point.m_MarkerIndices = {body.m_MarkerIndices[i]};
+    point.m_SegmentIndices = body.m_SegmentIndices;
+    const Eigen::Vector3d local =
+        offset.m_Rotation * Eigen::Vector3d(positions[i][0], positions[i][1], positions[i][2]) +
+        offset.m_Translation;
+    point.m_State = {local.x(), local.y(), local.z()};
+    const Eigen::Matrix<double, 3, 3, Eigen::RowMajor> c(covariances[i].data());
+    const Eigen::Matrix<double, 3, 3, Eigen::RowMajor> rotated =
+        offset.m_Rotation * c * offset.m_Rotation.transpose();
+    point.m_Covariance.assign(rotated.data(), rotated.data() + 9);
+    if (i < body.m_ViewNormals.size()) {
+      const auto& n = body.m_ViewNormals[i];
+      const Eigen::Vector3d normal = offset.m_Rotation * Eigen::Vector3d(n[0], n[1], n[2]);
+      point.m_ViewNormals = {{normal.x(), normal.y(), normal.z()}};
+    }
+    points.push_back(std::move(point));
+  }
+  targets = std::move(points);
+  return true;
 }
 
 bool IsRigidBody(const VSubject& subject) {

@@ -57,6 +57,17 @@ bool WriteRigidBodyMarkers(CoreOstraTypes::VSubject::VTarget& io_rTarget,
 bool IsRigidBody(const CoreOstraTypes::VSubject& subject);
 bool IsRigidBody(const CoreOstraTypes::VSubjectParametrised& subject);
 
+/// Turns a rigid body of point targets on its root (its many-target form) into one ERigidBody
+/// target with an identity body offset, the points' states as marker positions and the
+/// covariances of Gaussian points as marker blocks (zero otherwise). Succeeds without change,
+/// saying so, when the subject already has its one ERigidBody target. The application data of
+/// the subject must be rebuilt afterwards.
+bool ConvertToRigidBodyTarget(CoreOstraTypes::VSubject& io_rSubject);
+
+/// The reverse: one ELocalPointToWorldPointGaussian target per marker of the ERigidBody target,
+/// on its segment, with the body offset applied to each position and covariance.
+bool ConvertToPointTargets(CoreOstraTypes::VSubject& io_rSubject);
+
 /// Attaches the rigid body `body` (a rigid-body subject with one ERigidBody target on a segment
 /// with a free joint) to `io_rSubject` as a new segment under the segment named `parentName`,
 /// with its markers and target appended. The application data of both must match their

@@ -2,6 +2,7 @@
 
 #include "DebugServices/AssertFail.h"
 #include "DebugServices/LogCapture.h"
+#include "River/CoreOstraTypesUtils/AngleAxis.h"
 #include "River/CoreOstraTypesUtils/RigidBodyUtils.h"
 #include "River/CoreOstraTypesUtils/SubjectCheck.h"
 #include "River/CoreOstraTypesUtils/SubjectEvaluation.h"
@@ -319,4 +320,45 @@ TEST(RigidBodyEdits, Refusals) {
                           "No other target should be associated with a target that is part of a "
                           "RigidBody!",
                           "No other segment should be parented to a RigidBody segment!"));
+}
+
+TEST(RigidBodyForms, PointsToOneTargetAndBack) {
+  VSubject subject = MakeBody("").m_Subject;
+  ZMT::VLogCapture capture;
+  // The body's offset moves and turns its markers; the point form carries that.
+  ASSERT_TRUE(ConvertToPointTargets(subject));
+  ASSERT_EQ(subject.m_Targets.size(), 3u);
+  const VPose offset = PoseFromAngleAxis({0.1, 0.2, 0.3}, {1, 2, 3});
+  const auto p1 = Positions(3)[1];
+  const Eigen::Vector3d expected =
+      offset.m_Rotation * Eigen::Vector3d(p1[0], p1[1], p1[2]) + offset.m_Translation;
+  EXPECT_NEAR(subject.m_Targets[1].m_State[0], expected.x(), 1e-12);
+  EXPECT_NEAR(subject.m_Targets[1].m_State[2], expected.z(), 1e-12);
+  EXPECT_TRUE(SubjectCheck(subject));
+  EXPECT_TRUE(IsRigidBody(subject));
+
+  VSubject twoPoints = subject;
+  twoPoints.m_Targets.pop_back();
+
+  ASSERT_TRUE(ConvertToRigidBodyTarget(subject));
+  ASSERT_EQ(subject.m_Targets.size(), 1u);
+  EXPECT_TRUE(SubjectCheck(subject));
+  // Back to points: with an identity offset now, the same points as before.
+  VSubject again = subject;
+  ASSERT_TRUE(ConvertToPointTargets(again));
+  EXPECT_NEAR(again.m_Targets[1].m_State[0], expected.x(), 1e-12);
+  EXPECT_TRUE(capture.Messages(RigidBodyUtilsChannel).empty());
+
+  // Already in the wanted form; not a rigid body; two points naming two markers.
+  ASSERT_TRUE(ConvertToRigidBodyTarget(subject));
+  VSubject hinge = subject;
+  hinge.m_Segments[0].m_Joint.m_JointType = VJointTypeBase::EHinge;
+  EXPECT_FALSE(ConvertToPointTargets(hinge));
+  EXPECT_FALSE(ConvertToRigidBodyTarget(twoPoints));
+  EXPECT_THAT(capture.Messages(RigidBodyUtilsChannel),
+              ElementsAre("No conversion needed for subject Wand!",
+                          "A rigid body must have a free joint as root!",
+                          "Invalid input, subject Wand is not a rigid body!",
+                          "A rigid body must have at least 3 markers!",
+                          "Invalid input, subject Wand is not a rigid body!"));
 }
