@@ -1,4 +1,5 @@
 // anvil: loads the export module, reads scenes and exports them.
+#include "CheckCommand.h"
 #include "CommandOptions.h"
 #include "SchemaCommand.h"
 #include "Subcommands.h"
@@ -47,6 +48,16 @@ int main(int argc, char** argv) {
                    "'demo', scene files or subject files (.kmt .kmf .kms .kmr)")
       ->required();
 
+  std::vector<std::string> checkInputs;
+  bool checkJson = false;
+  CLI::App* pCheck = app.add_subcommand(
+      "check", "Check the subjects of subject files and scenes; exit 1 when a check fails");
+  pCheck
+      ->add_option("inputs", checkInputs,
+                   "Subject files (.kmt .kmf .kms .kmr), 'demo' or scene files")
+      ->required();
+  pCheck->add_flag("--json", checkJson, "Print the messages as a JSON array");
+
   std::string schemaLanguage, schemaOutput;
   CLI::App* pSchema = app.add_subcommand("schema", "Write the XSD of a file language");
   pSchema->add_option("language", schemaLanguage, "'kmt'")->required();
@@ -70,5 +81,6 @@ int main(int argc, char** argv) {
   if (pInfo->parsed()) return runInfo(common, infoInputs);
   if (pCommands->parsed()) return runCommandsListing(common.modulePath);
   if (pSchema->parsed()) return runSchema(schemaLanguage, schemaOutput);
+  if (pCheck->parsed()) return runCheck(checkInputs, checkJson, std::cout);
   return EExitUsage;
 }

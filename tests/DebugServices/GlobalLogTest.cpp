@@ -1,4 +1,5 @@
 #include "DebugServices/GlobalLog.h"
+#include "DebugServices/GlobalLogStream.h"
 #include "DebugServices/LogCapture.h"
 
 #include <gtest/gtest.h>
@@ -52,4 +53,32 @@ TEST(GlobalLog, ThrowingSinkDoesNotReachTheCaller) {
   auto previous = SetLogSink([](const LogRecord&) { throw std::runtime_error("sink failed"); });
   EXPECT_NO_THROW(ZMT_LOG("System", ELogError, "message %1%", 1));
   SetLogSink(previous);
+}
+
+namespace {
+// Streaming a value that counts its formatting shows whether a suppressed record formats.
+struct VCounted {
+  int* m_pCount;
+};
+std::ostream& operator<<(std::ostream& out, const VCounted& counted) {
+  ++*counted.m_pCount;
+  return out << "x";
+}
+} // namespace
+
+TEST(GlobalLogStream, OneRecordPerStatementAndNothingWhenSuppressed) {
+  VLogCapture capture(ELogWarning);
+  int formatted = 0;
+  const VCounted counted{&formatted};
+  ZMT_LOG_STREAM("SubjectCheck", ELogError) << "Segment "
+                                            << "Thigh"
+                                            << ", " << 3 << " and " << 0.1 + 0.2 << counted;
+  ZMT_LOG_STREAM("SubjectCheck", ELogInfo) << "dropped " << counted;
+  const auto records = capture.Records();
+  ASSERT_EQ(records.size(), 1u);
+  EXPECT_EQ(records[0].Channel, "SubjectCheck");
+  EXPECT_EQ(records[0].Level, ELogError);
+  EXPECT_EQ(records[0].Message, "Segment Thigh, 3 and 0.30000000000000004x");
+  EXPECT_NE(records[0].File.find("GlobalLogTest.cpp"), std::string::npos);
+  EXPECT_EQ(formatted, 1);
 }
