@@ -1,0 +1,103 @@
+#pragma once
+// The evaluable form of a calibrated subject: one run-time segment per model segment in tree
+// pre-order, one run-time target per model target it knows, and one flat state vector: the
+// joints' parameters in pre-order, each contiguous, then the parameters of targets that have
+// their own. Update evaluates forward kinematics and, if asked, Jacobian blocks for any state.
+//
+// The model is shared and must not change while a compute subject uses it. One thread at a time
+// per compute subject; a copy shares nothing that evaluation writes, so copies may run on other
+// threads.
+
+#include "OstraAlgo/ComputeSubjectFK/VComputeSegment.h"
+#include "OstraAlgo/ComputeSubjectFK/VComputeTarget.h"
+
+#include <memory>
+#include <random>
+#include <vector>
+
+namespace ComputeSubject {
+
+class IComputeSubject {
+public:
+  virtual ~IComputeSubject() = default;
+  virtual const KinematicAlgo::ISubjectCalibrated& Subject() const = 0;
+  virtual std::uint32_t NumSegments() const = 0;
+  virtual const VComputeSegment& Segment(std::uint32_t i) const = 0;
+  virtual std::uint32_t NumTargets() const = 0;
+  virtual const IComputeTarget& Target(std::uint32_t i) const = 0;
+  virtual std::uint32_t NumParams() const = 0;
+  virtual std::uint32_t NumJointParams() const = 0;
+  virtual std::uint32_t NumTargetParams() const = 0;
+  /// Forward kinematics and targets, no Jacobians.
+  virtual void Update(ConstView state) = 0;
+  /// Segments (and targets) for `state`, with Jacobian blocks of `type`. A state equal to the
+  /// previous one skips forward kinematics and only fills the Jacobians asked for.
+  virtual void UpdateSegments(ConstView state, std::uint32_t type) = 0;
+  virtual void UpdateTargets(ConstView state) = 0;
+};
+
+class VComputeSubject : public IComputeSubject {
+public:
+  /// `ignored` and `mode` are kept for callers that pass them and change nothing;
+  /// `useRotator` as for VComputeSegment. Targets without a run-time form are dropped; a target
+  /// whose segment is missing stays, with its Errors() set.
+  explicit VComputeSubject(std::shared_ptr<const KinematicAlgo::ISubjectCalibrated> subject,
+                           std::uint8_t ignored = 0, std::uint32_t mode = 1,
+                           std::uint32_t useRotator = 0);
+  /// Independent copy: segments and targets are rebuilt, targets follow the copy's segments.
+  VComputeSubject(const VComputeSubject& other);
+  VComputeSubject& operator=(const VComputeSubject&) = delete;
+
+  const KinematicAlgo::ISubjectCalibrated& Subject() const override { return *m_pSubject; }
+  std::uint32_t NumSegments() const override { return std::uint32_t(m_Segments.size()); }
+  const VComputeSegment& Segment(std::uint32_t i) const override { return m_Segments[i]; }
+  std::uint32_t NumTargets() const override { return std::uint32_t(m_Targets.size()); }
+  const IComputeTarget& Target(std::uint32_t i) const override { return *m_Targets[i]; }
+  /// The target as a position target, or null.
+  const VComputeTargetPosition* PositionTarget(std::uint32_t i) const;
+  std::uint32_t NumParams() const override { return m_NumJointParams + m_NumTargetParams; }
+  std::uint32_t NumJointParams() const override { return m_NumJointParams; }
+  std::uint32_t NumTargetParams() const override { return m_NumTargetParams; }
+  std::uint32_t Mode() const { return m_Mode; }
+  /// How many times forward kinematics has run over the tree (for callers that check caching).
+  std::uint64_t NumPoseEvaluations() const { return m_PoseEvaluations; }
+
+  void Update(ConstView state) override { UpdateSegments(state, ENone); }
+  void UpdateSegments(ConstView state, std::uint32_t type) override;
+  void UpdateTargets(ConstView state) override;
+
+  /// The dense Jacobian of all position targets' world positions (3 rows each, in target
+  /// order, zero rows for other targets) with respect to the joint state, from the blocks of
+  /// the last EChain update.
+  void TargetJacobian(Eigen::Ref<Eigen::MatrixXd> o_rJacobian) const;
+
+  /// State operations, each slice by the segment's parameter count, in tree order. Views must
+  /// hold NumJointParams() values at least.
+  void PriorMeanState(View o_rState) const;
+  void CurrentMeanState(View o_rState) const;
+  /// Draws each joint from its working prior; returns the sum of the squared standard normal
+  /// variates.
+  double SampleState(View o_rState, std::mt19937& gen) const;
+  void WhitenState(View o_rZ, ConstView x) const;
+  void ColourState(View o_rX, ConstView z) const;
+  void NormaliseState(View io_rState) const;
+  /// The parameters each joint needs to give its segment's current local pose; true only when
+  /// every joint could (within `tolerance`). Segments that fail still get their best reading.
+  bool StateFromWorldPoses(View o_rState, double tolerance) const;
+
+private:
+  void Build();
+
+  std::shared_ptr<const KinematicAlgo::ISubjectCalibrated> m_pSubject;
+  std::uint32_t m_Mode;
+  std::uint32_t m_UseRotator;
+  std::vector<VComputeSegment> m_Segments;
+  std::vector<std::unique_ptr<IComputeTarget>> m_Targets;
+  std::uint32_t m_NumJointParams = 0;
+  std::uint32_t m_NumTargetParams = 0;
+  std::vector<double> m_Cache;
+  bool m_FirstTime = true;
+  std::uint64_t m_PoseEvaluations = 0;
+};
+
+} // namespace ComputeSubject
