@@ -9,6 +9,7 @@ namespace ZMT {
 
 struct IFlowItemToken {
   static constexpr const char* SchemaName = "FlowItemToken";
+  static constexpr const char* FlowClassName = SchemaName;
 
   /// Unique among items of this type originating from the same store.
   std::uint32_t m_ItemId = 0xFFFFFFFFu;

@@ -22,6 +22,16 @@ public:
   double m_ImageError = 0.0;  ///< mean reprojection error, pixels
 
   bool operator==(const VCameraCalibration&) const = default;
+  static constexpr const char* FlowClassName = "CameraCalibration";
+  template <class S, class V> static void FlowFields(S& s, V&& v) {
+    v("PrincipalPoint", "", s.m_PrincipalPoint);
+    v("LensDistortionCalibration", "", s.m_LensDistortionCalibration);
+    v("Name", "", s.m_Name);
+    v("Orientation", "", s.m_Orientation);
+    v("Position", "", s.m_Position);
+    v("FocalLength", "", s.m_FocalLength);
+    v("ImageError", "", s.m_ImageError);
+  }
 };
 
 /// Quaternion (x, y, z, w) of a rotation vector v: w = cos(a / 2) and (x, y, z) = v sin(a / 2) / a

@@ -116,6 +116,15 @@ public:
   }
   bool hasTime() const { return m_StartTime != UnsetTime || m_EndTime != UnsetTime; }
   bool operator==(const VCameraCalibrationDetail&) const = default;
+  static constexpr const char* FlowClassName = "CameraCalibrationDetail";
+  template <class S, class V> static void FlowFields(S& s, V&& v) {
+    v("Type", "", s.m_Type);
+    v("StartTemperature", "", s.m_StartTemperature);
+    v("EndTemperature", "", s.m_EndTemperature);
+    v("StartTime", "", s.m_StartTime);
+    v("EndTime", "", s.m_EndTime);
+    v("Id", "", s.m_Id);
+  }
 };
 
 class VCameraCalibrationDetails {
@@ -127,6 +136,12 @@ public:
   VCameraCalibrationDetail m_IntrinsicsCalibration;
 
   bool operator==(const VCameraCalibrationDetails&) const = default;
+  static constexpr const char* FlowClassName = "CameraCalibrationDetails";
+  template <class S, class V> static void FlowFields(S& s, V&& v) {
+    v("DeviceURN", "", s.m_DeviceURN);
+    v("Calibration", "", s.m_Calibration);
+    v("IntrinsicsCalibration", "", s.m_IntrinsicsCalibration);
+  }
 };
 
 } // namespace CoreOstraTypes

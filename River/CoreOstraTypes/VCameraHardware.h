@@ -20,6 +20,16 @@ public:
   double m_PixelAspectRatio = 1.0; ///< pixel width over pixel height
 
   bool operator==(const VCameraHardware&) const = default;
+  static constexpr const char* FlowClassName = "CameraHardware";
+  template <class S, class V> static void FlowFields(S& s, V&& v) {
+    v("DeviceURN", "", s.m_DeviceURN);
+    v("DeviceName", "", s.m_DeviceName);
+    v("Type", "", s.m_Type);
+    v("DisplayType", "", s.m_DisplayType);
+    v("SensorWidth", "", s.m_SensorWidth);
+    v("SensorHeight", "", s.m_SensorHeight);
+    v("PixelAspectRatio", "", s.m_PixelAspectRatio);
+  }
 };
 
 } // namespace CoreOstraTypes

@@ -33,6 +33,12 @@ public:
   std::array<double, 2> m_RadialDistortionCentre{0.0, 0.0};
 
   bool operator==(const VCameraLensDistortion&) const = default;
+  static constexpr const char* FlowClassName = "LensDistortionCalibration";
+  template <class S, class V> static void FlowFields(S& s, V&& v) {
+    v("RadialParameters", "", s.m_RadialParameters);
+    v("RadialDistortionCentre", "", s.m_RadialDistortionCentre);
+    v("Model", "", s.m_Model);
+  }
 };
 
 } // namespace CoreOstraTypes

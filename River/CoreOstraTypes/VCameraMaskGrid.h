@@ -16,6 +16,14 @@ public:
   std::int32_t m_GridHeight = 0; ///< rows of tiles
 
   bool operator==(const VCameraMaskGrid&) const = default;
+  static constexpr const char* FlowClassName = "CameraMaskGrid";
+  template <class S, class V> static void FlowFields(S& s, V&& v) {
+    v("RunLengths", "", s.m_Data);
+    v("TileWidth", "", s.m_TileWidth);
+    v("TileHeight", "", s.m_TileHeight);
+    v("GridWidth", "", s.m_GridWidth);
+    v("GridHeight", "", s.m_GridHeight);
+  }
 };
 
 } // namespace CoreOstraTypes

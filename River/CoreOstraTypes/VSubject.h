@@ -24,6 +24,16 @@ public:
     std::vector<double> m_RangeCentringState; ///< empty: no value
     std::vector<double> m_RangeMatrix;        ///< empty: no value
     bool operator==(const VJoint&) const = default;
+    static constexpr const char* FlowClassName = "Joint";
+    template <class S, class V> static void FlowFields(S& s, V&& v) {
+      v("Name", "", s.m_Name);
+      v("JointType", "", s.m_JointType);
+      v("JointOrientation", "", s.m_JointOrientation);
+      v("Covariance", "", s.m_Covariance);
+      v("Mean", "", s.m_Mean);
+      v("RangeCentringState", "", s.m_RangeCentringState);
+      v("RangeMatrix", "", s.m_RangeMatrix);
+    }
   };
 
   struct VSegment {
@@ -38,6 +48,19 @@ public:
     std::array<double, 6> m_Bounds{};
     VJoint m_Joint;
     bool operator==(const VSegment&) const = default;
+    static constexpr const char* FlowClassName = "Segment";
+    template <class S, class V> static void FlowFields(S& s, V&& v) {
+      v("Name", "", s.m_Name);
+      v("SegmentIndex", "", s.m_SegmentIndex);
+      v("ParentSegmentIndex", "", s.m_ParentSegmentIndex);
+      v("TreeDepth", "", s.m_TreeDepth);
+      v("PreRotation", "", s.m_PreRotation);
+      v("PreTranslation", "", s.m_PreTranslation);
+      v("InversePostRotation", "", s.m_InversePostRotation);
+      v("InversePostTranslation", "", s.m_InversePostTranslation);
+      v("Bounds", "", s.m_Bounds);
+      v("Joint", "", s.m_Joint);
+    }
   };
 
   struct VMarker {
@@ -47,6 +70,14 @@ public:
     bool m_Missing = false;
     double m_ViewAngle = 0.0;
     bool operator==(const VMarker&) const = default;
+    static constexpr const char* FlowClassName = "Marker";
+    template <class S, class V> static void FlowFields(S& s, V&& v) {
+      v("Name", "", s.m_Name);
+      v("MarkerId", "", s.m_MarkerId);
+      v("Radius", "", s.m_Radius);
+      v("Missing", "", s.m_Missing);
+      v("ViewAngle", "", s.m_ViewAngle);
+    }
   };
 
   using VRotationObservation = VRotationObservationRecord;
@@ -64,6 +95,20 @@ public:
     std::vector<double> m_Covariance;                 ///< on the residuals
     std::vector<std::array<double, 3>> m_ViewNormals; ///< empty: no occlusion modelling
     bool operator==(const VTarget&) const = default;
+    static constexpr const char* FlowClassName = "Target";
+    template <class S, class V> static void FlowFields(S& s, V&& v) {
+      v("Type", "", s.m_Type);
+      v("Weight", "", s.m_Weight);
+      v("RotationCalibrationBehaviour", "", s.m_RotationCalibrationBehaviour);
+      v("RotationTargetOrientation", "", s.m_RotationTargetOrientation);
+      v("NumberOfDegreesOfFreedom", "", s.m_NumberOfDegreesOfFreedom);
+      v("MarkerIndices", "", s.m_MarkerIndices);
+      v("RotationObservationIndices", "", s.m_RotationObservationIndices);
+      v("SegmentIndices", "", s.m_SegmentIndices);
+      v("State", "", s.m_State);
+      v("Covariance", "", s.m_Covariance);
+      v("ViewNormals", "", s.m_ViewNormals);
+    }
   };
 
   std::string m_Name;
@@ -74,6 +119,15 @@ public:
   std::vector<VTarget> m_Targets;
 
   bool operator==(const VSubject&) const = default;
+  static constexpr const char* FlowClassName = "Subject";
+  template <class S, class V> static void FlowFields(S& s, V&& v) {
+    v("Name", "", s.m_Name);
+    v("SubjectId", "", s.m_SubjectId);
+    v("Segments", "", s.m_Segments);
+    v("Markers", "", s.m_Markers);
+    v("Rotations", "", s.m_Rotations);
+    v("Targets", "", s.m_Targets);
+  }
 };
 
 } // namespace CoreOstraTypes

@@ -16,6 +16,8 @@ public:
   struct VMarker {
     Colour m_Colour = DefaultColour;
     bool operator==(const VMarker&) const = default;
+    static constexpr const char* FlowClassName = "MarkerApplicationData";
+    template <class S, class V> static void FlowFields(S& s, V&& v) { v("Colour", "", s.m_Colour); }
   };
 
   struct VJoint {
@@ -32,6 +34,12 @@ public:
     std::string m_Labels; ///< labels of the state outputs, separated by blanks
     std::string m_Signs;  ///< one + or - per state output
     bool operator==(const VJoint&) const = default;
+    static constexpr const char* FlowClassName = "JointApplicationData";
+    template <class S, class V> static void FlowFields(S& s, V&& v) {
+      v("EulerOrder", "", s.m_EulerOrder);
+      v("Labels", "", s.m_Labels);
+      v("Signs", "", s.m_Signs);
+    }
   };
 
   struct VSegment {
@@ -63,6 +71,20 @@ public:
     bool m_Visible = true;
     VJoint m_Joint;
     bool operator==(const VSegment&) const = default;
+    static constexpr const char* FlowClassName = "SegmentApplicationData";
+    template <class S, class V> static void FlowFields(S& s, V&& v) {
+      v("Colour", "", s.m_Colour);
+      v("Context", "", s.m_Context);
+      v("DrawEndRatio", "", s.m_DrawEndRatio);
+      v("DrawHeight", "", s.m_DrawHeight);
+      v("DrawShading", "", s.m_DrawShading);
+      v("DrawStyle", "", s.m_DrawStyle);
+      v("DrawTwist", "", s.m_DrawTwist);
+      v("DrawWidth", "", s.m_DrawWidth);
+      v("Part", "", s.m_Part);
+      v("Visible", "", s.m_Visible);
+      v("Joint", "", s.m_Joint);
+    }
   };
 
   /// A line between two markers; indices into the subject's markers.
@@ -72,6 +94,13 @@ public:
     std::uint32_t m_MarkerIndexB = 0;
     Colour m_ColourB = DefaultColour;
     bool operator==(const VStick&) const = default;
+    static constexpr const char* FlowClassName = "Stick";
+    template <class S, class V> static void FlowFields(S& s, V&& v) {
+      v("MarkerIndexA", "", s.m_MarkerIndexA);
+      v("ColourA", "", s.m_ColourA);
+      v("MarkerIndexB", "", s.m_MarkerIndexB);
+      v("ColourB", "", s.m_ColourB);
+    }
   };
 
   struct VTarget {
@@ -86,6 +115,14 @@ public:
     std::string m_Name;
     bool m_Visible = true;
     bool operator==(const VTarget&) const = default;
+    static constexpr const char* FlowClassName = "TargetApplicationData";
+    template <class S, class V> static void FlowFields(S& s, V&& v) {
+      v("Colour", "", s.m_Colour);
+      v("DrawStyle", "", s.m_DrawStyle);
+      v("FillGaps", "", s.m_FillGaps);
+      v("Name", "", s.m_Name);
+      v("Visible", "", s.m_Visible);
+    }
   };
 
   std::uint32_t m_SubjectId = InvalidId;
@@ -101,6 +138,20 @@ public:
   std::string m_RetargetSourceSubject;
 
   bool operator==(const VSubjectApplicationData&) const = default;
+  static constexpr const char* FlowClassName = "SubjectApplicationData";
+  template <class S, class V> static void FlowFields(S& s, V&& v) {
+    v("SubjectId", "", s.m_SubjectId);
+    v("Markers", "", s.m_Markers);
+    v("Segments", "", s.m_Segments);
+    v("Sticks", "", s.m_Sticks);
+    v("Targets", "", s.m_Targets);
+    v("Colour", "", s.m_Colour);
+    v("Skin", "", s.m_Skin);
+    v("SkinColourA", "", s.m_SkinColourA);
+    v("SkinColourB", "", s.m_SkinColourB);
+    v("RetargetSourceTemplate", "", s.m_RetargetSourceTemplate);
+    v("RetargetSourceSubject", "", s.m_RetargetSourceSubject);
+  }
 };
 
 } // namespace CoreOstraTypes

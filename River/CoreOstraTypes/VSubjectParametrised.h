@@ -35,6 +35,18 @@ public:
     ZMT::IOptional<double> m_Prior;
     EQuantity m_Quantity = EQuantityScalar;
     bool operator==(const VStaticParameter&) const = default;
+    static constexpr const char* FlowClassName = "StaticParameter";
+    template <class S, class V> static void FlowFields(S& s, V&& v) {
+      v("Advanced", "", s.m_Advanced);
+      v("Visible", "", s.m_Visible);
+      v("ReadOnly", "", s.m_ReadOnly);
+      v("Required", "", s.m_Required);
+      v("Name", "", s.m_Name);
+      v("DefaultExpression", "", s.m_DefaultExpression);
+      v("UserValue", "", s.m_UserValue);
+      v("Prior", "", s.m_Prior);
+      v("Quantity", "", s.m_Quantity);
+    }
   };
 
   struct VDynamicParameter {
@@ -44,6 +56,14 @@ public:
     double m_Value = 0.0;
     bool m_Visible = true;
     bool operator==(const VDynamicParameter&) const = default;
+    static constexpr const char* FlowClassName = "DynamicParameter";
+    template <class S, class V> static void FlowFields(S& s, V&& v) {
+      v("Name", "", s.m_Name);
+      v("Prior", "", s.m_Prior);
+      v("StandardDeviation", "", s.m_StandardDeviation);
+      v("Value", "", s.m_Value);
+      v("Visible", "", s.m_Visible);
+    }
   };
 
   struct VJoint : VJointTypeBase {
@@ -62,6 +82,23 @@ public:
     std::vector<double> m_TemplateRangeMatrix;
     std::vector<double> m_BindPose; ///< n entries or empty
     bool operator==(const VJoint&) const = default;
+    static constexpr const char* FlowClassName = "ParametrisedJoint";
+    template <class S, class V> static void FlowFields(S& s, V&& v) {
+      v("Name", "", s.m_Name);
+      v("JointType", "", s.m_JointType);
+      v("JointOrientation", "", s.m_JointOrientation);
+      v("Covariance", "", s.m_Covariance);
+      v("Mean", "", s.m_Mean);
+      v("TPoseCovariance", "", s.m_TPoseCovariance);
+      v("TPoseMean", "", s.m_TPoseMean);
+      v("RangeCentringState", "", s.m_RangeCentringState);
+      v("RangeMatrix", "", s.m_RangeMatrix);
+      v("TemplateCovariance", "", s.m_TemplateCovariance);
+      v("TemplateMean", "", s.m_TemplateMean);
+      v("TemplateRangeCentringState", "", s.m_TemplateRangeCentringState);
+      v("TemplateRangeMatrix", "", s.m_TemplateRangeMatrix);
+      v("BindPose", "", s.m_BindPose);
+    }
   };
 
   /// Segment pose relative to its parent: P * J * Q^-1, with P the pre transform, J the joint and
@@ -81,6 +118,22 @@ public:
     std::array<std::string, 3> m_RadiusOfGyrationExpressions;
     std::array<std::string, 6> m_Bounds; ///< lower x, y, z then upper x, y, z
     bool operator==(const VSegment&) const = default;
+    static constexpr const char* FlowClassName = "ParametrisedSegment";
+    template <class S, class V> static void FlowFields(S& s, V&& v) {
+      v("Name", "", s.m_Name);
+      v("SegmentIndex", "", s.m_SegmentIndex);
+      v("ParentSegmentIndex", "", s.m_ParentSegmentIndex);
+      v("TreeDepth", "", s.m_TreeDepth);
+      v("Joint", "", s.m_Joint);
+      v("PreRotation", "", s.m_PreRotation);
+      v("PreTranslation", "", s.m_PreTranslation);
+      v("InversePostRotation", "", s.m_InversePostRotation);
+      v("InversePostTranslation", "", s.m_InversePostTranslation);
+      v("MassExpression", "", s.m_MassExpression);
+      v("MassCentreExpressions", "", s.m_MassCentreExpressions);
+      v("RadiusOfGyrationExpressions", "", s.m_RadiusOfGyrationExpressions);
+      v("Bounds", "", s.m_Bounds);
+    }
   };
 
   struct VMarker {
@@ -97,6 +150,15 @@ public:
     EMarkerStatus m_Status = ERequired;
     double m_ViewAngle = 0.0; ///< width of the visibility cone, radians
     bool operator==(const VMarker&) const = default;
+    static constexpr const char* FlowClassName = "ParametrisedMarker";
+    template <class S, class V> static void FlowFields(S& s, V&& v) {
+      v("Name", "", s.m_Name);
+      v("MarkerId", "", s.m_MarkerId);
+      v("Missing", "", s.m_Missing);
+      v("Radius", "", s.m_Radius);
+      v("Status", "", s.m_Status);
+      v("ViewAngle", "", s.m_ViewAngle);
+    }
   };
 
   using VRotationObservation = VRotationObservationRecord;
@@ -117,6 +179,23 @@ public:
     std::vector<double> m_RotationTargetOrientation; ///< empty or 3
     std::uint32_t m_NumberOfDegreesOfFreedom = 0;
     bool operator==(const VTarget&) const = default;
+    static constexpr const char* FlowClassName = "ParametrisedTarget";
+    template <class S, class V> static void FlowFields(S& s, V&& v) {
+      v("Covariance", "", s.m_Covariance);
+      v("PlacementCovariance", "", s.m_PlacementCovariance);
+      v("MarkerIndices", "", s.m_MarkerIndices);
+      v("RotationObservationIndices", "", s.m_RotationObservationIndices);
+      v("SegmentIndices", "", s.m_SegmentIndices);
+      v("StateExpressions", "", s.m_StateExpressions);
+      v("TemplateCovariance", "", s.m_TemplateCovariance);
+      v("ViewNormals", "", s.m_ViewNormals);
+      v("Type", "", s.m_Type);
+      v("Weight", "", s.m_Weight);
+      v("CalibrationWeight", "", s.m_CalibrationWeight);
+      v("RotationCalibrationBehaviour", "", s.m_RotationCalibrationBehaviour);
+      v("RotationTargetOrientation", "", s.m_RotationTargetOrientation);
+      v("NumberOfDegreesOfFreedom", "", s.m_NumberOfDegreesOfFreedom);
+    }
   };
 
   std::string m_Name;
@@ -133,6 +212,21 @@ public:
   std::vector<ZMT::IOptional<double>> m_TPoseConstraints; ///< per joint parameter
 
   bool operator==(const VSubjectParametrised&) const = default;
+  static constexpr const char* FlowClassName = "SubjectParametrised";
+  template <class S, class V> static void FlowFields(S& s, V&& v) {
+    v("SubjectId", "", s.m_SubjectId);
+    v("StaticParameters", "", s.m_StaticParameters);
+    v("DynamicParameters", "", s.m_DynamicParameters);
+    v("Segments", "", s.m_Segments);
+    v("Markers", "", s.m_Markers);
+    v("Rotations", "", s.m_Rotations);
+    v("Targets", "", s.m_Targets);
+    v("TPoseConstraints", "", s.m_TPoseConstraints);
+    v("Name", "", s.m_Name);
+    v("Model", "", s.m_Model);
+    v("ModelVersion", "", s.m_ModelVersion);
+    v("MarkerSetName", "", s.m_MarkerSetName);
+  }
 };
 
 } // namespace CoreOstraTypes

@@ -1,7 +1,7 @@
 #pragma once
 #include "HTime.h"
 #include "HostExport.h"
-#include "ITimecode.h"
+#include "Flow2/Flow2Types/ITimecode.h"
 
 /// How the scene counts timecode (`HTimeManager::getTimecodeMode`).
 enum ETimecodeMode {

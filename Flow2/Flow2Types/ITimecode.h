@@ -1,4 +1,5 @@
 #pragma once
+// A timecode as the host reads it off its clock and as the Flow timecode item carries it.
 #include <cstdint>
 
 namespace ZMT {
@@ -56,6 +57,17 @@ template <int64_t TicksPerSecond> struct ITimecode {
   }
 
   bool operator==(const ITimecode&) const = default;
+
+  static constexpr const char* FlowClassName = "Timecode";
+  template <class S, class V> static void FlowFields(S& s, V&& v) {
+    v("Standard", "Timecode standard", s.m_standard);
+    v("Hours", "", s.m_hours);
+    v("Minutes", "", s.m_minutes);
+    v("Seconds", "", s.m_seconds);
+    v("Frames", "", s.m_frames);
+    v("Subframes", "Ticks past the frame's start", s.m_subframes);
+    v("SubframeUnit", "Ticks in one subframe", s.m_subframeUnit);
+  }
 };
 
 } // namespace ZMT
