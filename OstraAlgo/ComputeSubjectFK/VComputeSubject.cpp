@@ -25,7 +25,7 @@ void VComputeSubject::Build() {
   std::map<std::int32_t, std::int32_t> byIdentifier;
   for (std::int32_t i = 0; i < tree.Size(); ++i) {
     if (!tree[i].m_Value) throw VConstructionException("VComputeSubject: a segment is missing");
-    m_Segments.emplace_back(*tree[i].m_Value, m_UseRotator != 0);
+    m_Segments.emplace_back(*tree[i].m_Value, m_UseRotator != 0, m_Mode == EFreeSegmentsMode);
     m_Segments.back().SetUp(i, tree[i].m_Parent, m_NumJointParams, std::uint32_t(tree.Depth(i)));
     m_NumJointParams += m_Segments.back().NumParams();
     byIdentifier.emplace(tree[i].m_Value->Identifier(), i);
@@ -33,13 +33,14 @@ void VComputeSubject::Build() {
   for (std::uint32_t t = 0; t < m_pSubject->NumTargets(); ++t) {
     const auto target = m_pSubject->Target(t);
     const auto* single = dynamic_cast<const ITargetSingleParent*>(target.get());
-    const std::string key = target->Key();
-    if (!single || (key != "TargetPosition" && key != "TargetPositionWithCovariance")) continue;
+    if (!single) continue;
     const auto it = byIdentifier.find(std::int32_t(single->ParentIdentifier()));
     const VComputeSegment* parent =
         it == byIdentifier.end() ? nullptr : &m_Segments[size_t(it->second)];
-    m_Targets.push_back(std::make_unique<VComputeTargetPosition>(*target, parent));
-    m_NumTargetParams += m_Targets.back()->NumParams();
+    auto computed = MakeComputeTarget(*target, parent);
+    if (!computed) continue;
+    m_NumTargetParams += computed->NumParams();
+    m_Targets.push_back(std::move(computed));
   }
   m_Cache.assign(NumParams(), 0.0);
   m_FirstTime = true;

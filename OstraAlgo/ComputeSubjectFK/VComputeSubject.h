@@ -38,8 +38,10 @@ public:
 
 class VComputeSubject : public IComputeSubject {
 public:
-  /// `ignored` and `mode` are kept for callers that pass them and change nothing;
-  /// `useRotator` as for VComputeSegment. Targets without a run-time form are dropped; a target
+  /// `ignored` is kept for callers that pass it and changes nothing. `mode` EFreeSegmentsMode
+  /// places every segment by six free parameters (the state is then six per segment in tree
+  /// order, see VComputeSegment); any other value uses the joints. `useRotator` as for
+  /// VComputeSegment. Targets without a run-time form are dropped; a target
   /// whose segment is missing stays, with its Errors() set.
   explicit VComputeSubject(std::shared_ptr<const KinematicAlgo::ISubjectCalibrated> subject,
                            std::uint8_t ignored = 0, std::uint32_t mode = 1,
