@@ -1,5 +1,6 @@
 #include "OstraAlgo/ComputeSubjectFK/VComputeSegment.h"
 
+#include "OstraAlgo/KinematicAlgo/VJointFunctionalFree.h"
 #include "OstraAlgo/KinematicAlgo/VJointFunctionalRotator.h"
 
 namespace ComputeSubject {
@@ -16,8 +17,9 @@ JointGaussian Prior(const Eigen::VectorXd& mean, const Eigen::MatrixXd& covarian
 }
 } // namespace
 
-VComputeSegment::VComputeSegment(const ISegmentCalibrated& segment, bool useRotator)
-    : m_pSegment(&segment), m_UsesRotator(useRotator) {
+VComputeSegment::VComputeSegment(const ISegmentCalibrated& segment, bool useRotator,
+                                 bool freeSegment)
+    : m_pSegment(&segment), m_UsesRotator(useRotator), m_FreeSegment(freeSegment) {
   const auto joint = segment.Joint();
   std::unique_ptr<VJointFunctional> functional =
       joint ? MakeJointFunctional(joint->Type()) : nullptr;
@@ -31,9 +33,16 @@ VComputeSegment::VComputeSegment(const ISegmentCalibrated& segment, bool useRota
     m_Q.m_Rotation = m_Q.m_Rotation * m_A;
   }
   m_QInverse = m_Q.Inverse();
+  m_ModelP = m_P;
+  VJointFunctionalFree().ComputeParams(View(m_FreeParams), View(), m_P, 1e10);
+  if (freeSegment) {
+    // P becomes the free joint's transform; the model's joint takes no part.
+    functional = std::make_unique<VJointFunctionalFree>();
+    m_P = VPose();
+  }
   m_pJoint = std::move(functional);
   m_NumParams = m_pJoint ? m_pJoint->NumDynamicParams() : 0;
-  if (joint) {
+  if (joint && !freeSegment) {
     m_DynamicPrior = Prior(joint->MeanDynamic(), joint->CovDynamic(), m_NumParams);
     m_RangePrior = Prior(joint->CentreDynamic(), joint->RangeDynamic(), m_NumParams);
   } else {
@@ -53,7 +62,8 @@ VComputeSegment::VComputeSegment(const VComputeSegment& other)
       m_World(other.m_World), m_JointFrame(other.m_JointFrame),
       m_DynamicPrior(other.m_DynamicPrior), m_CurrentPrior(other.m_CurrentPrior),
       m_RangePrior(other.m_RangePrior), m_Own(other.m_Own), m_Blocks(other.m_Blocks),
-      m_NumBlocks(other.m_NumBlocks) {}
+      m_NumBlocks(other.m_NumBlocks), m_FreeSegment(other.m_FreeSegment), m_ModelP(other.m_ModelP),
+      m_FreeParams(other.m_FreeParams), m_FreeJacobian(other.m_FreeJacobian) {}
 
 void VComputeSegment::SetUp(std::int32_t index, std::int32_t parent, std::uint32_t firstParam,
                             std::uint32_t depth) {
@@ -62,6 +72,7 @@ void VComputeSegment::SetUp(std::int32_t index, std::int32_t parent, std::uint32
   m_FirstParam = firstParam;
   m_Own.m_FirstParam = firstParam;
   m_Blocks.assign(depth + 1, JointJacobian());
+  m_FreeJacobian.m_FirstParam = 6 * std::uint32_t(index);
 }
 
 void VComputeSegment::UpdatePose(const double* params, const VComputeSegment* parent) {
@@ -85,6 +96,10 @@ void VComputeSegment::UpdateJacobian(const double* params, const VComputeSegment
   const bool chain = type == EChain || type == EChainOnly;
   const bool joint = type == EJoint || type == EJointOnly;
   m_NumBlocks = 0;
+  if (type == EFree || type == EFreeOnly) {
+    UpdateFreeJacobian(params, parent);
+    return;
+  }
   if (!chain && !joint) return;
   if (m_pJoint) m_pJoint->ComputeJacobian(ConstView(params, m_NumParams), ConstView(), m_Own);
   // The own block: P ∂J Q⁻¹, then into world axes by the parent's rotation.
@@ -118,6 +133,33 @@ void VComputeSegment::UpdateJacobian(const double* params, const VComputeSegment
     }
   }
   m_NumBlocks = parent->m_NumBlocks + 1;
+}
+
+void VComputeSegment::UpdateFreeJacobian(const double* params, const VComputeSegment* parent) {
+  // W = parent W ∘ F ∘ K with K = J Q⁻¹ (in free mode F is the joint and K = Q⁻¹).
+  VPose K = m_QInverse;
+  if (!m_FreeSegment) {
+    VJointFunctionalFree().ComputeJacobian(ConstView(m_FreeParams), ConstView(), m_FreeJacobian);
+    K = m_Joint * m_QInverse;
+  } else {
+    m_pJoint->ComputeJacobian(ConstView(params, 6), ConstView(), m_FreeJacobian);
+  }
+  JointJacobian& block = m_Blocks[0];
+  block.m_NumParams = 6;
+  block.m_FirstParam = 6 * std::uint32_t(m_Index);
+  for (std::uint32_t k = 0; k < 6; ++k) {
+    const Matrix3r& dR = m_FreeJacobian.m_dR[k];
+    const Matrix3r dRLocal = dR * K.m_Rotation;
+    const Eigen::Vector3d dTLocal = dR * K.m_Translation + m_FreeJacobian.m_dT[k];
+    if (parent) {
+      block.m_dR[k].noalias() = parent->m_World.m_Rotation * dRLocal;
+      block.m_dT[k].noalias() = parent->m_World.m_Rotation * dTLocal;
+    } else {
+      block.m_dR[k] = dRLocal;
+      block.m_dT[k] = dTLocal;
+    }
+  }
+  m_NumBlocks = 1;
 }
 
 } // namespace ComputeSubject

@@ -9,6 +9,7 @@
 #include "OstraAlgo/KinematicAlgo/JointJacobian.h"
 #include "OstraAlgo/KinematicAlgo/VJointFunctional.h"
 
+#include <array>
 #include <memory>
 #include <vector>
 
@@ -27,7 +28,14 @@ public:
   /// joint moves in its own axes; with it P and Q stay as the model has them and the joint is
   /// wrapped in a rotator around A. Both give the pose P A J A⁻¹ Q⁻¹ in the parent. A joint
   /// type out of range leaves the joint null; evaluation then treats it as having no parameters.
-  VComputeSegment(const KinematicAlgo::ISegmentCalibrated& segment, bool useRotator);
+  ///
+  /// With `freeSegment` the segment is placed by six free parameters instead of its joint: its
+  /// pose in the parent is F Q⁻¹, F the free transform (rotation vector, translation) of its
+  /// six parameters, which stand for P (A folded in); the model's joint is ignored and the
+  /// priors are zero-mean. FreeParams() of the model pose with the joint at rest give the same
+  /// poses as the joint form with zero parameters.
+  VComputeSegment(const KinematicAlgo::ISegmentCalibrated& segment, bool useRotator,
+                  bool freeSegment = false);
   VComputeSegment(const VComputeSegment& other);
   VComputeSegment& operator=(const VComputeSegment&) = delete;
 
@@ -47,13 +55,22 @@ public:
   const VPose& JointFrameInWorld() const { return m_JointFrame; }
   /// P and Q as evaluated (with A folded in unless the rotator is used).
   const VPose& PoseInParent() const { return m_P; }
+  /// P as the model gives it (A folded in unless the rotator is used), also in free mode, and
+  /// its six free parameters (rotation vector, translation).
+  const VPose& ModelPoseInParent() const { return m_ModelP; }
+  const std::array<double, 6>& FreeParams() const { return m_FreeParams; }
+  bool IsFree() const { return m_FreeSegment; }
   const VPose& PoseInThis() const { return m_Q; }
 
   /// The Jacobian blocks of the last update, by the type asked for: the segment's own block
-  /// first, then one per ancestor towards the root (EChain), or the own block alone (EJoint).
-  /// Each block's m_FirstParam locates its columns in the state.
+  /// first, then one per ancestor towards the root (EChain), the own block alone (EJoint), or
+  /// (EFree) one block: the derivative of the world pose with respect to the six free
+  /// parameters of P, in world axes, its columns at 6 × Index() (the free layout, six per
+  /// segment in tree order). Each block's m_FirstParam locates its columns.
   const std::vector<JointJacobian>& JacobianBlocks() const { return m_Blocks; }
   std::uint32_t NumJacobianBlocks() const { return m_NumBlocks; }
+  /// After an EFree update: dP/d(free parameters) in the parent's axes, not transformed.
+  const JointJacobian& FreeJacobian() const { return m_FreeJacobian; }
 
   /// The dynamic prior, its working copy (used by sampling and whitening) and the range prior.
   const JointGaussian& DynamicPrior() const { return m_DynamicPrior; }
@@ -69,8 +86,10 @@ private:
              std::uint32_t depth);
   /// Forward kinematics from the joint parameters; parent null at the root.
   void UpdatePose(const double* params, const VComputeSegment* parent);
-  /// Jacobian blocks of `type` (EChain or EJoint, with or without "only").
+  /// Jacobian blocks of `type` (EChain, EJoint or EFree, with or without "only").
   void UpdateJacobian(const double* params, const VComputeSegment* parent, std::uint32_t type);
+  /// The EFree block: `params` are the segment's own (used in free mode only).
+  void UpdateFreeJacobian(const double* params, const VComputeSegment* parent);
 
   std::shared_ptr<KinematicAlgo::VJointFunctional> m_pJoint;
   const KinematicAlgo::ISegmentCalibrated* m_pSegment;
@@ -93,6 +112,10 @@ private:
   JointJacobian m_Own;
   std::vector<JointJacobian> m_Blocks;
   std::uint32_t m_NumBlocks = 0;
+  bool m_FreeSegment;
+  VPose m_ModelP;
+  std::array<double, 6> m_FreeParams{};
+  JointJacobian m_FreeJacobian{6};
 };
 
 } // namespace ComputeSubject

@@ -1,6 +1,7 @@
 #include "OstraAlgo/ComputeSubjectFK/VComputeSubject.h"
 
 #include <algorithm>
+#include <cmath>
 #include <map>
 
 namespace ComputeSubject {
@@ -25,7 +26,7 @@ void VComputeSubject::Build() {
   std::map<std::int32_t, std::int32_t> byIdentifier;
   for (std::int32_t i = 0; i < tree.Size(); ++i) {
     if (!tree[i].m_Value) throw VConstructionException("VComputeSubject: a segment is missing");
-    m_Segments.emplace_back(*tree[i].m_Value, m_UseRotator != 0);
+    m_Segments.emplace_back(*tree[i].m_Value, m_UseRotator != 0, m_Mode == EFreeSegmentsMode);
     m_Segments.back().SetUp(i, tree[i].m_Parent, m_NumJointParams, std::uint32_t(tree.Depth(i)));
     m_NumJointParams += m_Segments.back().NumParams();
     byIdentifier.emplace(tree[i].m_Value->Identifier(), i);
@@ -33,13 +34,14 @@ void VComputeSubject::Build() {
   for (std::uint32_t t = 0; t < m_pSubject->NumTargets(); ++t) {
     const auto target = m_pSubject->Target(t);
     const auto* single = dynamic_cast<const ITargetSingleParent*>(target.get());
-    const std::string key = target->Key();
-    if (!single || (key != "TargetPosition" && key != "TargetPositionWithCovariance")) continue;
+    if (!single) continue;
     const auto it = byIdentifier.find(std::int32_t(single->ParentIdentifier()));
     const VComputeSegment* parent =
         it == byIdentifier.end() ? nullptr : &m_Segments[size_t(it->second)];
-    m_Targets.push_back(std::make_unique<VComputeTargetPosition>(*target, parent));
-    m_NumTargetParams += m_Targets.back()->NumParams();
+    auto computed = MakeComputeTarget(*target, parent);
+    if (!computed) continue;
+    m_NumTargetParams += computed->NumParams();
+    m_Targets.push_back(std::move(computed));
   }
   m_Cache.assign(NumParams(), 0.0);
   m_FirstTime = true;
@@ -143,6 +145,75 @@ bool VComputeSubject::StateFromWorldPoses(View o_rState, double tolerance) const
                                             joint, tolerance);
   }
   return std::find(succeeded.begin(), succeeded.end(), false) == succeeded.end();
+}
+
+void VComputeSubject::BlendStates(View io_rA, ConstView b, double wa, double wb) const {
+  for (const VComputeSegment& s : m_Segments)
+    if (s.NumParams())
+      s.Joint()->Blend(io_rA.subspan(s.FirstParam(), s.NumParams()),
+                       b.subspan(s.FirstParam(), s.NumParams()), wa, wb);
+}
+
+void VComputeSubject::UnwrapState(View io_rState, ConstView reference) const {
+  constexpr double turn = 2.0 * 3.14159265358979323846;
+  for (const VComputeSegment& s : m_Segments) {
+    double* x = io_rState.data() + s.FirstParam();
+    const double* ref = reference.data() + s.FirstParam();
+    if (s.NumParams() >= 3) {
+      Eigen::Map<Eigen::Vector3d> r(x);
+      const double theta = r.norm();
+      if (theta <= 1e-10) continue;
+      const Eigen::Vector3d axis = r / theta;
+      const double along = axis.dot(Eigen::Map<const Eigen::Vector3d>(ref));
+      r = axis * (theta - std::rint((theta - along) / turn) * turn);
+    } else {
+      for (std::uint32_t i = 0; i < s.NumParams(); ++i)
+        x[i] -= std::rint((x[i] - ref[i]) / turn) * turn;
+    }
+  }
+}
+
+void VComputeSubject::RecentrePrior(ConstView state) {
+  for (VComputeSegment& s : m_Segments) {
+    s.m_CurrentPrior = s.m_DynamicPrior;
+    s.m_CurrentPrior.SetMean(
+        Eigen::Map<const Eigen::VectorXd>(state.data() + s.FirstParam(), s.NumParams()));
+  }
+}
+
+void VComputeSubject::RecentrePrior(ConstView state, double weight) {
+  for (VComputeSegment& s : m_Segments) {
+    s.m_CurrentPrior = s.m_DynamicPrior;
+    if (!(weight >= 0.0 && weight <= 1.0) || !s.NumParams()) continue;
+    Eigen::VectorXd mean =
+        Eigen::Map<const Eigen::VectorXd>(state.data() + s.FirstParam(), s.NumParams());
+    s.Joint()->Blend(View(mean.data(), size_t(mean.size())),
+                     ConstView(s.m_DynamicPrior.Mean().data(), s.NumParams()), 1.0 - weight,
+                     weight);
+    s.m_CurrentPrior.SetMean(mean);
+  }
+}
+
+void VComputeSubject::FreeState(View o_rState) const {
+  for (size_t i = 0; i < m_Segments.size(); ++i)
+    std::copy_n(m_Segments[i].FreeParams().begin(), 6, o_rState.begin() + std::ptrdiff_t(6 * i));
+}
+
+bool VComputeSubject::WriteToModel(ISubjectCalibrated& io_rModel) const {
+  SegmentTree& tree = io_rModel.Segments();
+  if (tree.Size() != std::int32_t(m_Segments.size())) return false;
+  for (size_t i = 0; i < m_Segments.size(); ++i) {
+    const VComputeSegment& s = m_Segments[i];
+    VPose P = s.m_FreeSegment ? s.m_Joint : s.m_ModelP;
+    VPose Q = s.m_Q;
+    if (!s.m_UsesRotator) {
+      P.m_Rotation = P.m_Rotation * s.m_A.transpose();
+      Q.m_Rotation = Q.m_Rotation * s.m_A.transpose();
+    }
+    tree[std::int32_t(i)].m_Value->SetPoseInParent(P);
+    tree[std::int32_t(i)].m_Value->SetPoseInThis(Q);
+  }
+  return true;
 }
 
 } // namespace ComputeSubject

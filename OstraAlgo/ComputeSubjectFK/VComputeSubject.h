@@ -38,8 +38,10 @@ public:
 
 class VComputeSubject : public IComputeSubject {
 public:
-  /// `ignored` and `mode` are kept for callers that pass them and change nothing;
-  /// `useRotator` as for VComputeSegment. Targets without a run-time form are dropped; a target
+  /// `ignored` is kept for callers that pass it and changes nothing. `mode` EFreeSegmentsMode
+  /// places every segment by six free parameters (the state is then six per segment in tree
+  /// order, see VComputeSegment); any other value uses the joints. `useRotator` as for
+  /// VComputeSegment. Targets without a run-time form are dropped; a target
   /// whose segment is missing stays, with its Errors() set.
   explicit VComputeSubject(std::shared_ptr<const KinematicAlgo::ISubjectCalibrated> subject,
                            std::uint8_t ignored = 0, std::uint32_t mode = 1,
@@ -81,6 +83,25 @@ public:
   void WhitenState(View o_rZ, ConstView x) const;
   void ColourState(View o_rX, ConstView z) const;
   void NormaliseState(View io_rState) const;
+  /// a = Blend(a, b, wa, wb) joint by joint, on each joint's manifold.
+  void BlendStates(View io_rA, ConstView b, double wa, double wb) const;
+  /// Moves each joint's angles by whole turns to lie nearest `reference`, by parameter count: for
+  /// three or more parameters the rotation vector's length, for one or two each value (a
+  /// slider's distance included, as it has no way to tell).
+  void UnwrapState(View io_rState, ConstView reference) const;
+  /// The working prior of every joint becomes its dynamic prior centred on `state`.
+  void RecentrePrior(ConstView state);
+  /// The working prior becomes the dynamic prior with its mean Blend(state, mean, 1 - weight,
+  /// weight); for a weight outside [0, 1] the mean stays the dynamic prior's.
+  void RecentrePrior(ConstView state, double weight);
+  /// Six free parameters (rotation vector, translation) of each segment's P as the model gives
+  /// it, in tree order: the state of the free-segment mode that puts every joint at rest.
+  void FreeState(View o_rState) const;
+  /// Stores each segment's P (in the free-segment mode the one of the last update) and Q into
+  /// the segment of `io_rModel` at the same tree position, with the joint's fixed rotation taken
+  /// out again. False, with `io_rModel` untouched, when its tree has another size.
+  bool WriteToModel(KinematicAlgo::ISubjectCalibrated& io_rModel) const;
+
   /// The parameters each joint needs to give its segment's current local pose; true only when
   /// every joint could (within `tolerance`). Segments that fail still get their best reading.
   bool StateFromWorldPoses(View o_rState, double tolerance) const;

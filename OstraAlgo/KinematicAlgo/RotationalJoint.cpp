@@ -32,7 +32,8 @@ void BlendRotation(double* io_pA, const double* pB, double wa, double wb) {
   if (std::abs(theta) > 1e-10) {
     const double step = (theta - std::rint(theta / TwoPi) * TwoPi) * wb / (wa + wb);
     const Eigen::Vector3d axis = qr.head<3>().normalized();
-    result = QuaternionMultiply(qa, QuaternionFromRotationVector(axis * step));
+    // qr = qb qa⁻¹, so the step goes on the left: step = theta gives qb.
+    result = QuaternionMultiply(QuaternionFromRotationVector(axis * step), qa);
   }
   if (result[3] < -0.9) result = -result;
   const Eigen::Vector3d r = QuaternionLog(result);

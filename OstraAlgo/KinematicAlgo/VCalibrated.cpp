@@ -1,4 +1,5 @@
 #include "OstraAlgo/KinematicAlgo/VCalibrated.h"
+#include "OstraAlgo/KinematicAlgo/VCalibratedTargets.h"
 
 namespace KinematicAlgo {
 
@@ -72,9 +73,7 @@ bool VTargetPositionWithCovariance::Equals(const ITargetCalibrated& o) const {
 VTargetFactory& VTargetFactory::Factory() {
   static VTargetFactory factory = [] {
     VTargetFactory f;
-    f.Register("TargetPosition", [] { return std::make_shared<VTargetPosition>(); });
-    f.Register("TargetPositionWithCovariance",
-               [] { return std::make_shared<VTargetPositionWithCovariance>(); });
+    RegisterModelTargets(f);
     return f;
   }();
   return factory;

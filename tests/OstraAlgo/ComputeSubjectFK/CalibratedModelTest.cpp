@@ -44,7 +44,7 @@ TEST(CalibratedModel, ACopySharesNothingAndKeepsMarkersTiedToTheirTargets) {
 
 TEST(CalibratedModel, FactoryKnowsTargetsByKeyInRegistrationOrder) {
   EXPECT_EQ(VTargetPosition().Type(), 0);
-  EXPECT_EQ(VTargetPositionWithCovariance().Type(), 1);
+  EXPECT_EQ(VTargetPositionWithCovariance().Type(), 2);
   EXPECT_EQ(VTargetFactory::Factory().Index("NoSuchTarget"), -1);
   EXPECT_EQ(VTargetFactory::Factory().Create("NoSuchTarget"), nullptr);
   EXPECT_STREQ(VTargetFactory::Factory().Create("TargetPositionWithCovariance")->Key(),
@@ -79,7 +79,7 @@ VSubject TwoSegmentRecord() {
   return subject;
 }
 
-TEST(CalibratedModel, ARecordBecomesATreeWithItsPointTargets) {
+TEST(CalibratedModel, ARecordBecomesATreeWithItsTargets) {
   std::vector<std::string> errors, notes;
   const auto model = SubjectCalibratedFromRecord(TwoSegmentRecord(), errors, notes);
   ASSERT_TRUE(model) << errors.front();
@@ -89,9 +89,11 @@ TEST(CalibratedModel, ARecordBecomesATreeWithItsPointTargets) {
   EXPECT_EQ(lower.Joint()->MeanDynamic(), Eigen::VectorXd::Constant(1, 0.5));
   // The record holds Q⁻¹; the model holds Q.
   EXPECT_EQ(lower.PoseInThis().m_Translation, Eigen::Vector3d(0, 0, 10));
-  ASSERT_EQ(model->NumTargets(), 1u);
+  ASSERT_EQ(model->NumTargets(), 2u);
+  ASSERT_EQ(model->NumMarkers(), 1u);
   EXPECT_EQ(model->Marker(0)->Name(), "ELB");
-  EXPECT_EQ(notes.size(), 1u);
+  EXPECT_STREQ(model->Target(1)->Key(), "TargetOrientation");
+  EXPECT_TRUE(notes.empty());
 }
 
 TEST(CalibratedModel, RecordsThatAreNotATreeAreRefused) {

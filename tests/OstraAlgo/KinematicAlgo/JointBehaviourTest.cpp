@@ -80,6 +80,16 @@ TEST(JointBehaviour, BlendMovesAlongTheRotationAndLeavesEqualRotationsAlone) {
   EXPECT_LT((a.head<3>() - axis * 0.8).norm(), 1e-12);
   // Translation weights are not normalised.
   EXPECT_LT((a.tail<3>() - Eigen::Vector3d(10.0, 8.0, 6.0)).norm(), 1e-12);
+  // Rotations about different axes: all weight on b gives b, equal weights the geodesic
+  // midpoint, as far from a as from b.
+  Eigen::Vector3d c(0.3, -0.9, 0.4), d(-1.1, 0.2, 0.7);
+  Eigen::Vector3d toB = c;
+  VJointFunctionalBall().Blend(View(toB.data(), 3), ConstView(d.data(), 3), 0.0, 1.0);
+  EXPECT_LT((Exp(toB) - Exp(d)).norm(), 1e-12);
+  Eigen::Vector3d middle = c;
+  VJointFunctionalBall().Blend(View(middle.data(), 3), ConstView(d.data(), 3), 1.0, 1.0);
+  EXPECT_NEAR(Log(Exp(c).transpose() * Exp(middle)).norm(),
+              Log(Exp(middle).transpose() * Exp(d)).norm(), 1e-12);
   double h = 3.0, other = -3.0;
   VJointFunctionalHinge().Blend(View(&h, 1), ConstView(&other, 1), 0.5, 0.5);
   EXPECT_DOUBLE_EQ(h, 0.0);

@@ -1,0 +1,120 @@
+#pragma once
+// Model targets beyond the fixed point: a plane or a ray fixed in a segment (each optionally with
+// a covariance on its residual), an orientation, a direction, and a rigid body of markers.
+// Every vector and matrix is in the parent segment's frame.
+
+#include "OstraAlgo/KinematicAlgo/VCalibrated.h"
+
+namespace KinematicAlgo {
+
+/// A target whose residual has a covariance of its own (the Gaussian forms of the plane and the
+/// ray). An empty matrix means the plain form.
+class ITargetResidualCovariance {
+public:
+  virtual ~ITargetResidualCovariance() = default;
+  virtual const Eigen::MatrixXd& ResidualCovariance() const = 0;
+  virtual void SetResidualCovariance(const Eigen::MatrixXd& covariance) = 0;
+};
+
+/// A target that carries a direction (a ray's direction, a plane's normal, a direction target's
+/// vector). Setters store the vector as given; the record conversion normalises it.
+class ITargetDirection {
+public:
+  virtual ~ITargetDirection() = default;
+  virtual const Eigen::Vector3d& DirectionInParent() const = 0;
+  virtual void SetDirectionInParent(const Eigen::Vector3d& direction) = 0;
+};
+
+/// Shared by the plane and the ray: a point, a direction and an optional residual covariance.
+class VTargetPointDirection : public VTargetPosition,
+                              public ITargetDirection,
+                              public ITargetResidualCovariance {
+public:
+  using VTargetPosition::VTargetPosition;
+  bool Equals(const ITargetCalibrated& other) const override;
+  const Eigen::Vector3d& DirectionInParent() const override { return m_Direction; }
+  void SetDirectionInParent(const Eigen::Vector3d& d) override { m_Direction = d; }
+  const Eigen::MatrixXd& ResidualCovariance() const override { return m_ResidualCovariance; }
+  void SetResidualCovariance(const Eigen::MatrixXd& c) override { m_ResidualCovariance = c; }
+
+private:
+  Eigen::Vector3d m_Direction = Eigen::Vector3d::UnitZ();
+  Eigen::MatrixXd m_ResidualCovariance;
+};
+
+/// A plane through PositionInParent() with normal DirectionInParent(): "TargetSegmentPlane".
+/// Its residual is the signed distance of an observed point (covariance 1 x 1).
+class VTargetSegmentPlane : public VTargetPointDirection {
+public:
+  using VTargetPointDirection::VTargetPointDirection;
+  std::shared_ptr<ITargetCalibrated> Clone() const override {
+    return std::make_shared<VTargetSegmentPlane>(*this);
+  }
+  const char* Key() const override { return "TargetSegmentPlane"; }
+};
+
+/// A ray from PositionInParent() along DirectionInParent(): "TargetSegmentRay". Its residual is
+/// the offset of an observed point across the ray (covariance 2 x 2).
+class VTargetSegmentRay : public VTargetPointDirection {
+public:
+  using VTargetPointDirection::VTargetPointDirection;
+  std::shared_ptr<ITargetCalibrated> Clone() const override {
+    return std::make_shared<VTargetSegmentRay>(*this);
+  }
+  const char* Key() const override { return "TargetSegmentRay"; }
+};
+
+/// A direction fixed in the segment, observed as a world direction: "TargetDirection".
+class VTargetDirection : public VTargetPointDirection {
+public:
+  using VTargetPointDirection::VTargetPointDirection;
+  std::shared_ptr<ITargetCalibrated> Clone() const override {
+    return std::make_shared<VTargetDirection>(*this);
+  }
+  const char* Key() const override { return "TargetDirection"; }
+};
+
+/// A rotation fixed in the segment, observed as a world rotation: "TargetOrientation". Its
+/// position in parent is unused (zero).
+class VTargetOrientation : public VTargetPosition {
+public:
+  using VTargetPosition::VTargetPosition;
+  std::shared_ptr<ITargetCalibrated> Clone() const override {
+    return std::make_shared<VTargetOrientation>(*this);
+  }
+  bool Equals(const ITargetCalibrated& other) const override;
+  const char* Key() const override { return "TargetOrientation"; }
+  const Eigen::Matrix3d& OrientationInParent() const { return m_Orientation; }
+  void SetOrientationInParent(const Eigen::Matrix3d& r) { m_Orientation = r; }
+
+private:
+  Eigen::Matrix3d m_Orientation = Eigen::Matrix3d::Identity();
+};
+
+/// Markers at fixed places relative to each other: "TargetRigidBody". The body's pose in the
+/// parent segment is B; each member's PositionInParent() is its place in the body's frame, so
+/// its place in the segment is B ∘ position. PositionInParent() of the body itself is B's
+/// translation.
+class VTargetRigidBody : public VTargetPosition {
+public:
+  using VTargetPosition::VTargetPosition;
+  /// Deep: members are cloned.
+  std::shared_ptr<ITargetCalibrated> Clone() const override;
+  bool Equals(const ITargetCalibrated& other) const override;
+  const char* Key() const override { return "TargetRigidBody"; }
+  const VPose& BodyPoseInParent() const { return m_Body; }
+  void SetBodyPoseInParent(const VPose& pose);
+  std::uint32_t NumMembers() const { return std::uint32_t(m_Members.size()); }
+  const VTargetPosition& Member(std::uint32_t i) const { return *m_Members[i]; }
+  std::shared_ptr<VTargetPosition> MemberPtr(std::uint32_t i) const { return m_Members[i]; }
+  void AddMember(std::shared_ptr<VTargetPosition> member) { m_Members.push_back(member); }
+
+private:
+  VPose m_Body;
+  std::vector<std::shared_ptr<VTargetPosition>> m_Members;
+};
+
+/// Registers every model target class with `factory`, in a fixed order (the order gives Type()).
+void RegisterModelTargets(VTargetFactory& factory);
+
+} // namespace KinematicAlgo
