@@ -44,7 +44,6 @@ bool ReadConverted(INode& node, std::string_view name, T& o_rValue, std::string_
   return true;
 }
 
-
 using VNumbers = boost::container::small_vector<double, 36>;
 
 /// Splits `text` at blanks and converts each token, into `o_rValues`. Short plain decimals are
@@ -81,11 +80,10 @@ template <class F> bool ScanNumbers(std::string_view text, VNumbers& o_rValues, 
     }
     double value = 0.0;
     if (plain && digits > 0 && digits <= 15) {
-      value = static_cast<double>(mantissa) /
-              powersOfTen[fractionDigits < 0 ? 0 : fractionDigits];
+      value = static_cast<double>(mantissa) / powersOfTen[fractionDigits < 0 ? 0 : fractionDigits];
       if (negative) value = -value;
-    } else if (parsed && !parse(std::string_view(start, static_cast<std::size_t>(p - start)),
-                                value)) {
+    } else if (parsed &&
+               !parse(std::string_view(start, static_cast<std::size_t>(p - start)), value)) {
       parsed = false;
     }
     o_rValues.push_back(value);
@@ -240,9 +238,9 @@ bool ReadOptionalDoubleList(INode& node, std::string_view name, std::vector<doub
 }
 
 bool ReadDoubleListReplacing(INode& node, std::string_view name, std::vector<double>& o_rValues,
-                            std::size_t count, std::string_view documentation,
-                            std::string_view type, bool required, const IVersion& lower,
-                            const IVersion& upper) {
+                             std::size_t count, std::string_view documentation,
+                             std::string_view type, bool required, const IVersion& lower,
+                             const IVersion& upper) {
   VNumbers values;
   if (!ReadNumbers(node, name, values, count, documentation, type, required, lower, upper,
                    ParseListedDouble)) {
