@@ -74,13 +74,8 @@ bool ReadExpressions(INode& node, std::string_view name, std::array<std::string,
                      std::string_view documentation, bool required,
                      const IVersion& lower = Versions::None,
                      const IVersion& upper = Versions::None) {
-  std::vector<std::string> values;
-  if (!UtilsRapidXml::ReadExpressionList(node, name, values, N, 0, documentation, XsdString,
-                                         required, lower, upper)) {
-    return false;
-  }
-  std::copy(values.begin(), values.end(), o_rValue.begin());
-  return true;
+  return UtilsRapidXml::ReadExpressionArray(node, name, o_rValue, documentation, XsdString,
+                                            required, lower, upper);
 }
 
 /// Exactly N numbers into a fixed array.
@@ -88,13 +83,8 @@ template <std::size_t N>
 bool ReadNumbers(INode& node, std::string_view name, std::array<double, N>& o_rValue,
                  std::string_view documentation, const IVersion& lower = Versions::None,
                  const IVersion& upper = Versions::None) {
-  std::vector<double> values;
-  if (!UtilsRapidXml::ReadDoubleList(node, name, values, N, 0, documentation, XsdString, false,
-                                     lower, upper)) {
-    return false;
-  }
-  std::copy(values.begin(), values.end(), o_rValue.begin());
-  return true;
+  return UtilsRapidXml::ReadDoubleArray(node, name, o_rValue, documentation, XsdString, false,
+                                        lower, upper);
 }
 
 /// A list of numbers of a given count (AnyCount for any) into a vector.

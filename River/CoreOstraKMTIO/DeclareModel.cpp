@@ -47,13 +47,8 @@ void VReadContext::DropSegmentsFrom(std::uint32_t index) {
 bool ReadNumberList(INode& node, std::string_view name, std::vector<double>& o_rValues,
                     std::size_t count, std::string_view documentation, bool required,
                     const IVersion& lower, const IVersion& upper) {
-  std::vector<double> values;
-  if (!ReadDoubleList(node, name, values, count, 0, documentation, XsdString, required, lower,
-                      upper)) {
-    return false;
-  }
-  o_rValues = std::move(values);
-  return true;
+  return ReadDoubleListReplacing(node, name, o_rValues, count, documentation, XsdString, required,
+                                 lower, upper);
 }
 
 bool ReadText(INode& node, std::string_view name, std::string& o_rValue,

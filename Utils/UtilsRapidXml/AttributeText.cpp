@@ -179,11 +179,15 @@ bool ParseBool(std::string_view text, bool& o_rValue) {
     o_rValue = trimmed == "1";
     return true;
   }
-  std::string lower(trimmed);
-  for (char& c : lower)
-    c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
-  if (lower == "true" || lower == "false") {
-    o_rValue = lower == "true";
+  // Case-insensitive for ASCII letters only, as tolower in the C locale.
+  auto equalsIgnoringCase = [trimmed](std::string_view lower) {
+    if (trimmed.size() != lower.size()) return false;
+    for (std::size_t i = 0; i < lower.size(); ++i)
+      if ((trimmed[i] | 0x20) != lower[i]) return false;
+    return true;
+  };
+  if (equalsIgnoringCase("true") || equalsIgnoringCase("false")) {
+    o_rValue = trimmed.size() == 4;
     return true;
   }
   return false;

@@ -44,37 +44,63 @@ bool ReadConverted(INode& node, std::string_view name, T& o_rValue, std::string_
   return true;
 }
 
-/// Stores `values` into `io_rTarget` from `offset`, growing it when needed.
-template <class T>
-void StoreAt(std::vector<T>& io_rTarget, std::size_t offset, std::vector<T>&& values) {
-  if (io_rTarget.size() < offset + values.size()) io_rTarget.resize(offset + values.size());
-  std::move(values.begin(), values.end(), io_rTarget.begin() + static_cast<std::ptrdiff_t>(offset));
+using VNumbers = boost::container::small_vector<double, 36>;
+
+/// Splits `text` at blanks and converts each token, into `o_rValues`. Short plain decimals are
+/// converted as they are scanned, with ParseShortDecimal's arithmetic (so to the same value);
+/// other tokens go to `parse`. Returns false when a token did not convert (the count of
+/// `o_rValues` is still that of the tokens).
+template <class F> bool ScanNumbers(std::string_view text, VNumbers& o_rValues, F parse) {
+  static constexpr double powersOfTen[] = {1e0, 1e1, 1e2,  1e3,  1e4,  1e5,  1e6,  1e7,
+                                           1e8, 1e9, 1e10, 1e11, 1e12, 1e13, 1e14, 1e15};
+  bool parsed = true;
+  const char* p = text.data();
+  const char* const end = p + text.size();
+  while (p < end) {
+    while (p < end && IsBlank(*p))
+      ++p;
+    if (p == end) break;
+    const char* const start = p;
+    const bool negative = *p == '-';
+    if (negative) ++p;
+    std::uint64_t mantissa = 0;
+    int digits = 0, fractionDigits = -1; // -1 until the point
+    bool plain = true;
+    for (; p < end && !IsBlank(*p); ++p) {
+      const char c = *p;
+      if (c >= '0' && c <= '9') {
+        mantissa = mantissa * 10 + static_cast<std::uint64_t>(c - '0');
+        ++digits;
+        if (fractionDigits >= 0) ++fractionDigits;
+      } else if (c == '.' && fractionDigits < 0) {
+        fractionDigits = 0;
+      } else {
+        plain = false;
+      }
+    }
+    double value = 0.0;
+    if (plain && digits > 0 && digits <= 15) {
+      value = static_cast<double>(mantissa) / powersOfTen[fractionDigits < 0 ? 0 : fractionDigits];
+      if (negative) value = -value;
+    } else if (parsed &&
+               !parse(std::string_view(start, static_cast<std::size_t>(p - start)), value)) {
+      parsed = false;
+    }
+    o_rValues.push_back(value);
+  }
+  return parsed;
 }
 
+/// Reads the attribute as a list of `count` numbers (any for AnyCount) into `o_rValues`; the
+/// errors of a wrong count or a token that does not convert are reported here.
 template <class F>
-bool ReadNumberList(INode& node, std::string_view name, std::vector<double>& io_rValues,
-                    std::size_t count, std::size_t offset, std::string_view documentation,
-                    std::string_view type, bool required, const IVersion& lower,
-                    const IVersion& upper, F parse) {
+bool ReadNumbers(INode& node, std::string_view name, VNumbers& o_rValues, std::size_t count,
+                 std::string_view documentation, std::string_view type, bool required,
+                 const IVersion& lower, const IVersion& upper, F parse) {
   std::string_view text;
   if (!node.AttributeText(name, text, documentation, type, required, lower, upper)) return false;
-  // Numbers are converted as they are split, into a buffer on the stack for the usual short
-  // lists; the target changes only once the whole list converted.
-  boost::container::small_vector<double, 36> values;
-  bool parsed = true;
-  std::size_t i = 0;
-  while (i < text.size()) {
-    while (i < text.size() && IsBlank(text[i]))
-      ++i;
-    const std::size_t start = i;
-    while (i < text.size() && !IsBlank(text[i]))
-      ++i;
-    if (i == start) continue;
-    double value = 0.0;
-    if (parsed && !parse(text.substr(start, i - start), value)) parsed = false;
-    values.push_back(value);
-  }
-  if (count != AnyCount && values.size() != count) {
+  const bool parsed = ScanNumbers(text, o_rValues, parse);
+  if (count != AnyCount && o_rValues.size() != count) {
     node.Error(ZMT::FormatOrRaw("%1% node's %2% attribute had incorrect number of components",
                                 node.Name(), std::string(name)));
     return false;
@@ -83,8 +109,51 @@ bool ReadNumberList(INode& node, std::string_view name, std::vector<double>& io_
     ReportUninterpretable(node, name);
     return false;
   }
+  return true;
+}
+
+template <class F>
+bool ReadNumberList(INode& node, std::string_view name, std::vector<double>& io_rValues,
+                    std::size_t count, std::size_t offset, std::string_view documentation,
+                    std::string_view type, bool required, const IVersion& lower,
+                    const IVersion& upper, F parse) {
+  // The target changes only once the whole list converted.
+  VNumbers values;
+  if (!ReadNumbers(node, name, values, count, documentation, type, required, lower, upper, parse)) {
+    return false;
+  }
   if (io_rValues.size() < offset + values.size()) io_rValues.resize(offset + values.size());
   std::copy(values.begin(), values.end(), io_rValues.begin() + static_cast<std::ptrdiff_t>(offset));
+  return true;
+}
+
+bool ParseListedDouble(std::string_view text, double& o_rValue) {
+  return ParseDouble(text, o_rValue);
+}
+
+/// Splits as SplitExpressionList does, into views of `text`; false when a quoted name is open.
+bool SplitExpressionViews(std::string_view text,
+                          boost::container::small_vector<std::string_view, 8>& o_rTokens) {
+  // Every token is a run of the trimmed text between spaces outside quoted names.
+  text = TrimBlanks(text);
+  bool quoted = false, escaped = false;
+  std::size_t start = 0;
+  for (std::size_t i = 0; i < text.size(); ++i) {
+    const char c = text[i];
+    if (escaped) {
+      escaped = false;
+    } else if (quoted) {
+      if (c == '\\') escaped = true;
+      if (c == '\'') quoted = false;
+    } else if (c == '\'') {
+      quoted = true;
+    } else if (c == ' ') {
+      if (i > start) o_rTokens.push_back(text.substr(start, i - start));
+      start = i + 1;
+    }
+  }
+  if (quoted) return false;
+  if (text.size() > start) o_rTokens.push_back(text.substr(start));
   return true;
 }
 
@@ -139,23 +208,11 @@ bool ReadColour(INode& node, std::string_view name, ColourBytes& o_rValue,
                 std::string_view documentation, std::string_view type, bool required,
                 const IVersion& lower, const IVersion& upper) {
   auto convert = [](std::string_view text, ColourBytes& colour) {
-    std::string_view tokens[3];
-    std::size_t count = 0, i = 0;
-    while (i < text.size()) {
-      while (i < text.size() && IsBlank(text[i]))
-        ++i;
-      const std::size_t start = i;
-      while (i < text.size() && !IsBlank(text[i]))
-        ++i;
-      if (i == start) continue;
-      if (count == 3) return false;
-      tokens[count++] = text.substr(start, i - start);
-    }
-    if (count != 3) return false;
+    VNumbers components;
+    if (!ScanNumbers(text, components, ParseListedDouble) || components.size() != 3) return false;
     for (std::size_t k = 0; k < 3; ++k) {
-      double component = 0.0;
-      if (!ParseDouble(tokens[k], component) || std::isnan(component)) return false;
-      colour[k] = static_cast<std::uint8_t>(std::clamp(component, 0.0, 255.0));
+      if (std::isnan(components[k])) return false;
+      colour[k] = static_cast<std::uint8_t>(std::clamp(components[k], 0.0, 255.0));
     }
     colour[3] = 255;
     return true;
@@ -180,18 +237,74 @@ bool ReadOptionalDoubleList(INode& node, std::string_view name, std::vector<doub
                         [](std::string_view t, double& v) { return ParseOptionalDouble(t, v); });
 }
 
+bool ReadDoubleListReplacing(INode& node, std::string_view name, std::vector<double>& o_rValues,
+                             std::size_t count, std::string_view documentation,
+                             std::string_view type, bool required, const IVersion& lower,
+                             const IVersion& upper) {
+  VNumbers values;
+  if (!ReadNumbers(node, name, values, count, documentation, type, required, lower, upper,
+                   ParseListedDouble)) {
+    return false;
+  }
+  o_rValues.assign(values.begin(), values.end());
+  return true;
+}
+
+bool ReadDoubleArray(INode& node, std::string_view name, std::span<double> o_rValues,
+                     std::string_view documentation, std::string_view type, bool required,
+                     const IVersion& lower, const IVersion& upper) {
+  VNumbers values;
+  if (!ReadNumbers(node, name, values, o_rValues.size(), documentation, type, required, lower,
+                   upper, ParseListedDouble)) {
+    return false;
+  }
+  std::copy(values.begin(), values.end(), o_rValues.begin());
+  return true;
+}
+
+namespace {
+
+/// Reads and splits an expression list of `count` expressions (any for AnyCount).
+bool ReadExpressionViews(INode& node, std::string_view name,
+                         boost::container::small_vector<std::string_view, 8>& o_rTokens,
+                         std::size_t count, std::string_view documentation, std::string_view type,
+                         bool required, const IVersion& lower, const IVersion& upper) {
+  std::string_view text;
+  if (!node.AttributeText(name, text, documentation, type, required, lower, upper)) return false;
+  if (!SplitExpressionViews(text, o_rTokens) || (count != AnyCount && o_rTokens.size() != count)) {
+    ReportUninterpretable(node, name);
+    return false;
+  }
+  return true;
+}
+
+} // namespace
+
 bool ReadExpressionList(INode& node, std::string_view name, std::vector<std::string>& io_rValues,
                         std::size_t count, std::size_t offset, std::string_view documentation,
                         std::string_view type, bool required, const IVersion& lower,
                         const IVersion& upper) {
-  std::string_view text;
-  if (!node.AttributeText(name, text, documentation, type, required, lower, upper)) return false;
-  std::vector<std::string> tokens;
-  if (!SplitExpressionList(text, tokens) || (count != AnyCount && tokens.size() != count)) {
-    ReportUninterpretable(node, name);
+  boost::container::small_vector<std::string_view, 8> tokens;
+  if (!ReadExpressionViews(node, name, tokens, count, documentation, type, required, lower,
+                           upper)) {
     return false;
   }
-  StoreAt(io_rValues, offset, std::move(tokens));
+  if (io_rValues.size() < offset + tokens.size()) io_rValues.resize(offset + tokens.size());
+  for (std::size_t k = 0; k < tokens.size(); ++k)
+    io_rValues[offset + k].assign(tokens[k]);
+  return true;
+}
+
+bool ReadExpressionArray(INode& node, std::string_view name, std::span<std::string> o_rValues,
+                         std::string_view documentation, std::string_view type, bool required,
+                         const IVersion& lower, const IVersion& upper) {
+  boost::container::small_vector<std::string_view, 8> tokens;
+  if (!ReadExpressionViews(node, name, tokens, o_rValues.size(), documentation, type, required,
+                           lower, upper)) {
+    return false;
+  }
+  for (std::size_t k = 0; k < tokens.size(); ++k)
+    o_rValues[k].assign(tokens[k]);
   return true;
 }
 

@@ -11,6 +11,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <limits>
+#include <span>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -74,6 +75,19 @@ bool ReadOptionalDoubleList(INode& node, std::string_view name, std::vector<doub
                             const IVersion& lower = IVersion::None(),
                             const IVersion& upper = IVersion::None());
 
+/// As ReadDoubleList from offset 0, replacing the whole of `o_rValues` when the list was read.
+bool ReadDoubleListReplacing(INode& node, std::string_view name, std::vector<double>& o_rValues,
+                             std::size_t count, std::string_view documentation,
+                             std::string_view type, bool required,
+                             const IVersion& lower = IVersion::None(),
+                             const IVersion& upper = IVersion::None());
+
+/// Exactly `o_rValues.size()` numbers into `o_rValues`, left alone unless all were read.
+bool ReadDoubleArray(INode& node, std::string_view name, std::span<double> o_rValues,
+                     std::string_view documentation, std::string_view type, bool required,
+                     const IVersion& lower = IVersion::None(),
+                     const IVersion& upper = IVersion::None());
+
 /// Exactly `count` expressions (any number for AnyCount), split so that single-quoted names may
 /// hold blanks, stored from `offset` on.
 bool ReadExpressionList(INode& node, std::string_view name, std::vector<std::string>& io_rValues,
@@ -81,6 +95,13 @@ bool ReadExpressionList(INode& node, std::string_view name, std::vector<std::str
                         std::string_view type, bool required,
                         const IVersion& lower = IVersion::None(),
                         const IVersion& upper = IVersion::None());
+
+/// Declares the enumeration, then reads one of its keywords.
+/// Exactly `o_rValues.size()` expressions into `o_rValues`, left alone unless all were read.
+bool ReadExpressionArray(INode& node, std::string_view name, std::span<std::string> o_rValues,
+                         std::string_view documentation, std::string_view type, bool required,
+                         const IVersion& lower = IVersion::None(),
+                         const IVersion& upper = IVersion::None());
 
 /// Declares the enumeration, then reads one of its keywords.
 template <class T>

@@ -16,8 +16,9 @@ std::uint32_t NameKey(std::string_view name) {
          static_cast<unsigned char>(name.back());
 }
 
-std::uint64_t KeyBit(std::uint32_t key) {
-  return std::uint64_t{1} << ((key * 0x9E3779B1u) >> 26);
+/// The home slot of a key, one of 64.
+unsigned KeySlot(std::uint32_t key) {
+  return (key * 0x9E3779B1u) >> 26;
 }
 
 } // namespace
@@ -88,38 +89,62 @@ bool VReaderNode::Attribute(std::string_view name, std::string& o_rValue,
   return true;
 }
 
-bool VReaderNode::AttributeText(std::string_view name, std::string_view& o_rValue, std::string_view,
-                                std::string_view type, bool required, const IVersion& lower,
-                                const IVersion& upper) {
+std::size_t VReaderNode::FindAttribute(std::string_view name) {
   // Declaring a name visits every attribute of that name; the first one is the value.
   if (!m_AttributesListed) ListAttributes();
-  rapidxml::xml_attribute<>* attribute = nullptr;
   const std::uint32_t key = NameKey(name);
-  if (m_KeyBits & KeyBit(key)) {
-    for (std::size_t index = 0; index < m_Attributes.size(); ++index) {
+  unsigned slot = KeySlot(key);
+  if (!((m_KeyBits >> slot) & 1u)) return NoAttribute;
+  std::size_t found = NoAttribute;
+  if (!m_SlotsFull) {
+    // Attributes of one name share a home slot, so they all lie on the probe from it.
+    for (; m_Slots[slot] != EmptySlot; slot = (slot + 1) % SlotCount) {
+      const std::size_t index = m_Slots[slot];
       const auto& listed = m_Attributes[index];
       if (listed.m_Key != key || NodeName(listed.m_pAttribute) != name) continue;
       m_VisitedAttributes.Set(index);
-      if (!attribute) attribute = listed.m_pAttribute;
-      if (!m_KeysCollide) break; // no other attribute can bear this name
+      found = std::min(found, index);
     }
+    return found;
   }
+  for (std::size_t index = 0; index < m_Attributes.size(); ++index) {
+    const auto& listed = m_Attributes[index];
+    if (listed.m_Key != key || NodeName(listed.m_pAttribute) != name) continue;
+    m_VisitedAttributes.Set(index);
+    if (found == NoAttribute) found = index;
+  }
+  return found;
+}
+
+bool VReaderNode::AttributeText(std::string_view name, std::string_view& o_rValue, std::string_view,
+                                std::string_view type, bool required, const IVersion& lower,
+                                const IVersion& upper) {
+  const std::size_t index = FindAttribute(name);
   if (IsOutOfRange(m_pInfo->m_Version, lower, upper)) {
-    if (attribute) {
-      Warning(ZMT::FormatOrRaw(
-          "Ignoring %1% attribute in %2% element. Not supported in files with version %3%",
-          std::string(name), Name(), m_pInfo->m_Version.ToString()));
-    }
+    if (index != NoAttribute) ReportOutOfVersion(name);
     return false;
   }
-  if (!attribute) {
-    if (required) {
-      Error(ZMT::FormatOrRaw("%1% element missing required attribute %2%", Name(),
-                             std::string(name)));
-    }
+  if (index == NoAttribute) {
+    if (required) ReportMissing(name);
     return false;
   }
-  const std::string_view value = NodeValue(attribute);
+  const std::string_view value = NodeValue(m_Attributes[index].m_pAttribute);
+  if (type.size() >= 6 && type.substr(0, 6) == "xsd:ID") CheckId(type, value);
+  o_rValue = value;
+  return true;
+}
+
+void VReaderNode::ReportOutOfVersion(std::string_view name) {
+  Warning(ZMT::FormatOrRaw(
+      "Ignoring %1% attribute in %2% element. Not supported in files with version %3%",
+      std::string(name), Name(), m_pInfo->m_Version.ToString()));
+}
+
+void VReaderNode::ReportMissing(std::string_view name) {
+  Error(ZMT::FormatOrRaw("%1% element missing required attribute %2%", Name(), std::string(name)));
+}
+
+void VReaderNode::CheckId(std::string_view type, std::string_view value) {
   if (type == "xsd:ID") {
     if (!m_pInfo->m_Ids.emplace(value).second) {
       Warning(ZMT::FormatOrRaw("File contains duplicate ID : %1% ", std::string(value)));
@@ -129,17 +154,22 @@ bool VReaderNode::AttributeText(std::string_view name, std::string_view& o_rValu
       Warning(ZMT::FormatOrRaw("File contains unknown IDREF : %1% ", std::string(value)));
     }
   }
-  o_rValue = value;
-  return true;
 }
 
 void VReaderNode::ListAttributes() {
+  m_Slots.fill(EmptySlot);
   for (auto* attribute = m_pNode->first_attribute(); attribute;
        attribute = attribute->next_attribute()) {
     const std::uint32_t key = NameKey(NodeName(attribute));
-    const std::uint64_t bit = KeyBit(key);
-    m_KeysCollide = m_KeysCollide || (m_KeyBits & bit) != 0;
-    m_KeyBits |= bit;
+    unsigned slot = KeySlot(key);
+    m_KeyBits |= std::uint64_t{1} << slot;
+    if (m_Attributes.size() < MaxSlotted) {
+      while (m_Slots[slot] != EmptySlot)
+        slot = (slot + 1) % SlotCount;
+      m_Slots[slot] = static_cast<std::uint8_t>(m_Attributes.size());
+    } else {
+      m_SlotsFull = true; // the rest are found by scanning the list
+    }
     m_Attributes.push_back({key, attribute});
   }
   m_AttributesListed = true;

@@ -9,6 +9,7 @@
 #include <boost/container/small_vector.hpp>
 #include <rapidxml/rapidxml.hpp>
 
+#include <array>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -99,6 +100,14 @@ private:
   void ReportUnvisited();
   /// Fills m_Attributes on first use.
   void ListAttributes();
+  static constexpr std::size_t NoAttribute = ~std::size_t{0};
+  /// Marks every attribute named `name` visited; the position of the first, or NoAttribute.
+  std::size_t FindAttribute(std::string_view name);
+  // The messages, kept out of the lookup's way.
+  [[gnu::noinline, gnu::cold]] void ReportOutOfVersion(std::string_view name);
+  [[gnu::noinline, gnu::cold]] void ReportMissing(std::string_view name);
+  /// Records an xsd:ID value, or checks an xsd:IDREF one.
+  [[gnu::noinline]] void CheckId(std::string_view type, std::string_view value);
 
   rapidxml::xml_node<>* m_pNode;
   std::shared_ptr<VGlobalInfo> m_pInfo;
@@ -114,8 +123,14 @@ private:
     rapidxml::xml_attribute<>* m_pAttribute;
   };
   boost::container::small_vector<VListedAttribute, 16> m_Attributes;
-  std::uint64_t m_KeyBits = 0; ///< one bit per key present, to pass over absent names at once
-  bool m_KeysCollide = false;  ///< two attributes share a key bit: names may repeat
+  // An open-addressed table of the attributes' positions by key, probed linearly from each
+  // key's home slot; an element with more attributes than it takes is scanned instead.
+  static constexpr unsigned SlotCount = 64;
+  static constexpr std::size_t MaxSlotted = 48;
+  static constexpr std::uint8_t EmptySlot = 0xFF;
+  std::array<std::uint8_t, SlotCount> m_Slots;
+  std::uint64_t m_KeyBits = 0; ///< one bit per home slot in use, to pass over absent names at once
+  bool m_SlotsFull = false;
   bool m_AttributesListed = false;
   VVisitMarks m_VisitedElements;
   VDeclarations m_Declarations;

@@ -2,6 +2,7 @@
 // A set of small indices (positions of a node's attributes or children), held in one word for
 // the first 64 and spilling to the heap beyond.
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <vector>
@@ -16,7 +17,7 @@ public:
       return;
     }
     index -= WordBits;
-    if (m_More.size() <= index) m_More.resize(index + 1);
+    if (m_More.size() <= index) m_More.resize(std::max(index + 1, 2 * m_More.size()));
     m_More[index] = true;
   }
   bool Test(std::size_t index) const {
