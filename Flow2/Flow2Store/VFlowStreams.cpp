@@ -1,8 +1,11 @@
 #include "Flow2/Flow2Store/VFlowStreams.h"
 
+#include "Flow2/Flow2Store/VFlowBuffers.h"
+
 #include <algorithm>
 #include <cstring>
 #include <exception>
+#include <string>
 
 namespace Flow2Store {
 
@@ -31,6 +34,7 @@ bool VFlowOutputStream::AddPage() {
 
 bool VFlowOutputStream::Write(const void* pBuffer, std::uint64_t size) {
   if (m_Failed) return false;
+  m_Total += size;
   const auto* pBytes = static_cast<const std::uint8_t*>(pBuffer);
   while (size > 0) {
     if ((!m_pTail || m_pTail->GetSize() == m_pTail->GetCapacity()) && !AddPage()) return false;
@@ -49,24 +53,75 @@ bool VFlowOutputStream::Write(const void* pBuffer, std::uint64_t size) {
   return true;
 }
 
+bool VFlowOutputStream::Write(const std::shared_ptr<const ZMT::IBufferConst>& i_pBuffer) {
+  if (m_Failed) return false;
+  if (!i_pBuffer || i_pBuffer->GetSize() == 0) return true;
+  ZMT::IFlowBuffer* pPage = nullptr;
+  try {
+    pPage = m_rFactory.WrapShared(i_pBuffer);
+  } catch (const std::exception&) {
+    pPage = nullptr;
+  }
+  if (!pPage) {
+    m_Failed = true;
+    return false;
+  }
+  if (m_pTail)
+    m_pTail->SetNext(pPage);
+  else
+    m_pHead = pPage;
+  m_pTail = pPage; // full by construction: the next byte starts a new page
+  m_Total += i_pBuffer->GetSize();
+  return true;
+}
+
+std::uint64_t VFlowOutputStream::GetScratch(void*& o_rpData, std::uint64_t size) {
+  if (m_Failed || size == 0 || size > VFlowBufferFixed::Capacity) return 0;
+  if (!m_pTail || m_pTail->GetCapacity() - m_pTail->GetSize() < size || !m_pTail->GetMutableData())
+    if (!AddPage()) return 0;
+  const std::uint64_t used = m_pTail->GetSize();
+  std::uint8_t* pData = m_pTail->GetMutableData();
+  if (!pData || !m_pTail->SetSize(used + size)) return 0;
+  o_rpData = pData + used;
+  m_Total += size;
+  return size;
+}
+
 ZMT::IFlowBuffer* VFlowOutputStream::Detach() {
   if (m_Failed || (!m_pHead && !AddPage())) return nullptr;
   m_pTail = nullptr;
+  m_Total = 0;
   ZMT::IFlowBuffer* pHead = m_pHead;
   m_pHead = nullptr;
   return pHead;
+}
+
+ZMT::IFlowBuffer* VFlowOutputStream::TakeChain() {
+  ZMT::IFlowBuffer* pHead = m_pHead;
+  m_pHead = m_pTail = nullptr;
+  m_Total = 0;
+  if (m_Failed) {
+    m_Failed = false;
+    if (pHead) pHead->ReleaseChain();
+    return nullptr;
+  }
+  return pHead;
+}
+
+void VFlowInputStream::SkipEmpty() {
+  while (m_pPage && m_Offset == m_pPage->GetSize()) {
+    m_pPage = m_pPage->GetNext();
+    m_Offset = 0;
+  }
 }
 
 bool VFlowInputStream::Read(void* pBuffer, std::uint64_t size) {
   if (m_Failed) return false;
   auto* pBytes = static_cast<std::uint8_t*>(pBuffer);
   while (size > 0) {
-    while (m_pPage && m_Offset == m_pPage->GetSize()) {
-      m_pPage = m_pPage->GetNext();
-      m_Offset = 0;
-    }
+    SkipEmpty();
     if (!m_pPage) {
-      m_Failed = true;
+      m_Failed = m_Ended = true;
       return false;
     }
     const std::uint64_t piece = std::min(size, m_pPage->GetSize() - m_Offset);
@@ -76,6 +131,60 @@ bool VFlowInputStream::Read(void* pBuffer, std::uint64_t size) {
     size -= piece;
   }
   return true;
+}
+
+bool VFlowInputStream::ReadShared(std::uint64_t size,
+                                  std::shared_ptr<const ZMT::IBufferConst>& o_rBuffer) {
+  if (m_Failed) return false;
+  SkipEmpty();
+  if (!m_pPage) return false;
+  std::shared_ptr<const ZMT::IBufferConst> pShared = m_pPage->GetSharedBuffer();
+  if (!pShared || m_pPage->GetSize() - m_Offset < size) return false;
+  if (m_Offset == 0 && size == pShared->GetSize())
+    o_rBuffer = std::move(pShared);
+  else
+    o_rBuffer = std::make_shared<VBufferAlias>(std::move(pShared), m_Offset, size);
+  m_Offset += size;
+  SkipEmpty();
+  return true;
+}
+
+std::uint64_t VFlowInputStream::GetContiguous(const void*& o_rpData) {
+  SkipEmpty();
+  if (!m_pPage) return 0;
+  o_rpData = m_pPage->GetData() + m_Offset;
+  return m_pPage->GetSize() - m_Offset;
+}
+
+void VFlowInputStream::SetPosition(const void* i_pData) {
+  if (!m_pPage) return;
+  const auto* p = static_cast<const std::uint8_t*>(i_pData);
+  const std::uint8_t* pBegin = m_pPage->GetData();
+  if (p >= pBegin && p <= pBegin + m_pPage->GetSize())
+    m_Offset = static_cast<std::uint64_t>(p - pBegin);
+}
+
+bool VFlowInputStream::ReadTerminated(std::string& o_rText) {
+  o_rText.clear();
+  if (m_Failed) return false;
+  for (;;) {
+    SkipEmpty();
+    if (!m_pPage) {
+      m_Failed = m_Ended = true;
+      return false;
+    }
+    const auto* pBegin = reinterpret_cast<const char*>(m_pPage->GetData()) + m_Offset;
+    const std::uint64_t left = m_pPage->GetSize() - m_Offset;
+    const void* pZero = std::memchr(pBegin, 0, left);
+    if (pZero) {
+      const auto n = static_cast<std::uint64_t>(static_cast<const char*>(pZero) - pBegin);
+      o_rText.append(pBegin, n);
+      m_Offset += n + 1;
+      return true;
+    }
+    o_rText.append(pBegin, left);
+    m_Offset += left;
+  }
 }
 
 bool VFlowInputStream::AtEnd() const {
