@@ -72,6 +72,7 @@ bool VFlowOutputStream::Write(const std::shared_ptr<const ZMT::IBufferConst>& i_
     m_pHead = pPage;
   m_pTail = pPage; // full by construction: the next byte starts a new page
   m_Total += i_pBuffer->GetSize();
+  ++m_SharedCount;
   return true;
 }
 

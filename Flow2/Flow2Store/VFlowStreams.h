@@ -23,6 +23,8 @@ public:
   std::uint64_t GetScratch(void*& o_rpData, std::uint64_t size) override;
   std::uint64_t GetTotal() const override { return m_Total; }
   bool IsFailed() const { return m_Failed; }
+  /// Shared buffers linked in so far.
+  std::uint64_t GetSharedCount() const { return m_SharedCount; }
 
   /// Hands the chain over to the caller: at least one page, empty if nothing was written. Null if
   /// the stream failed.
@@ -40,6 +42,7 @@ private:
   ZMT::IFlowBuffer* m_pHead = nullptr;
   ZMT::IFlowBuffer* m_pTail = nullptr;
   std::uint64_t m_Total = 0;
+  std::uint64_t m_SharedCount = 0;
   bool m_Failed = false;
 };
 
