@@ -101,6 +101,8 @@ IResult VReader::Open(ZMT::IInputStreamSeekable* i_pStream) {
   if (m_Complete) {
     ReadTableChain(FirstTable, EChunkType::TypeTable, m_TypePositions);
     ReadTableChain(SecondTable, EChunkType::ItemTable, m_StaticPositions);
+  }
+  if (m_Complete) {
     for (std::uint64_t position : m_TypePositions) {
       if (ReadHeader(position, header) &&
           header.m_Type == std::uint16_t(EChunkType::TypeDefinition))
@@ -142,7 +144,10 @@ IResult VReader::Open(ZMT::IInputStreamSeekable* i_pStream) {
     }
     Scan(scanFrom);
   } else {
-    Problem("the file was not closed: its chunks were walked one by one");
+    // Not closed, or its tables are damaged: every chunk is walked.
+    Problem("the file's tables are missing or damaged: its chunks were walked one by one");
+    m_TypePositions.clear();
+    m_StaticPositions.clear();
     Scan(FirstTable);
   }
 
