@@ -54,6 +54,8 @@ bool VReader::ReadHeader(std::uint64_t position, VChunkHeader& o_rHeader) {
 }
 
 bool VReader::ReadPayload(std::uint64_t position, const VChunkHeader& header) {
+  if (position > m_Size || m_Size - position < Format::ChunkHeaderSize + std::uint64_t(header.m_PayloadSize))
+    return false;
   m_Payload.resize(header.m_PayloadSize);
   return ReadAt(position + Format::ChunkHeaderSize, m_Payload.data(), header.m_PayloadSize);
 }
@@ -113,16 +115,15 @@ IResult VReader::Open(ZMT::IInputStreamSeekable* i_pStream) {
     // The first index chunk follows the tables, perhaps after static items and definitions.
     std::uint64_t position = AfterTables;
     std::uint64_t scanFrom = AfterTables;
+    bool found = false;
     while (ReadHeader(position, header)) {
-      if (header.m_Type == std::uint16_t(EChunkType::SessionIndex)) break;
-      if (header.m_Type == std::uint16_t(EChunkType::StateHeader)) {
-        position = 0;
+      if (header.m_Type == std::uint16_t(EChunkType::SessionIndex)) found = true;
+      if (header.m_Type == std::uint16_t(EChunkType::SessionIndex) ||
+          header.m_Type == std::uint16_t(EChunkType::StateHeader))
         break;
-      }
       position += Format::ChunkHeaderSize + header.m_PayloadSize;
     }
-    if (position != 0 && position < m_Size &&
-        header.m_Type == std::uint16_t(EChunkType::SessionIndex)) {
+    if (found) {
       std::set<std::uint64_t> seen;
       for (;;) {
         if (!ParseSessionIndex(position, header, true)) {
@@ -409,6 +410,11 @@ IResult VReader::ReadState(std::size_t index, ZMT::IFlowStateHandle& o_rState) {
   VSessionInfo session;
   for (const VSessionInfo& info : m_Sessions)
     if (info.m_Session == entry.m_Session) session = info;
+  // Every item takes at least 8 bytes of what follows (a position in a group by reference).
+  if (std::uint64_t(count) * 8 > m_Size - entry.m_Position) {
+    Problem("state" + At(entry.m_Position) + " claims more items than the file holds");
+    return IResult::InvalidFormat;
+  }
   IResult result = m_States->CreateState(o_rState, time, session.m_Periodic, session.m_Absolute);
   if (result.IsFailure()) return result;
   o_rState->Reserve(count);

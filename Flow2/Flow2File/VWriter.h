@@ -130,7 +130,6 @@ private:
   Flow2Store::VFlowOutputStream m_Bodies;
   std::uint8_t* m_pChunkHeader = nullptr;
   VChunkHeader m_ChunkHeader;
-  bool m_LeftOut = false;
 };
 
 } // namespace Flow2File
