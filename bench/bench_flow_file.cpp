@@ -77,7 +77,8 @@ struct VRecorder {
 
   VRecorder() {
     auto& factory = Flow2Store::GetFlowStoreFactory();
-    Check(factory.CreateStore(m_Store, ZMT::MakeFlowItemFactories<VFlowBenchMarker>(), 1).IsSuccess() &&
+    Check(factory.CreateStore(m_Store, ZMT::MakeFlowItemFactories<VFlowBenchMarker>(), 1)
+                  .IsSuccess() &&
               factory.CreateBufferFactory(m_Buffers, nullptr).IsSuccess() &&
               factory.CreateStateFactory(m_States).IsSuccess(),
           "making the store");
@@ -238,7 +239,8 @@ int main(int argc, char** argv) {
   benchmark::Initialize(&argc, argv);
   Bench::RatioReporter reporter;
   benchmark::RunSpecifiedBenchmarks(&reporter);
-  reporter.printRatio("Flow file writer / plain fwrite of the same bytes", "BM_FlowFileWrite/iterations:3/manual_time",
+  reporter.printRatio("Flow file writer / plain fwrite of the same bytes",
+                      "BM_FlowFileWrite/iterations:3/manual_time",
                       "BM_PlainFwrite/iterations:3/manual_time");
   reporter.printRatio("Flow file reader (memory-mapped) / memcpy from the mapped file",
                       "BM_FlowFileRead/iterations:3", "BM_MappedMemcpy/iterations:3");

@@ -53,8 +53,9 @@ int main(int argc, char** argv) {
     for (int session = 1; session <= 1 + seed % 2; ++session)
       for (int f = 0; f < 4 + seed * 3; f += 1 + (f % 3 == 2)) {
         ZMT::IFlowStateHandle state;
-        Check(states->CreateState(state, {f * Period, std::uint64_t(Period), std::uint32_t(session)},
-                                  {}, {})
+        Check(states
+                  ->CreateState(state, {f * Period, std::uint64_t(Period), std::uint32_t(session)},
+                                {}, {})
                   .IsSuccess());
         for (int m = 0; m < 3; ++m) {
           ZMT::IFlowItemHandle marker;

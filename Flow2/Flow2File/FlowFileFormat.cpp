@@ -84,8 +84,7 @@ bool EncodeTypeDefinition(ZMT::IOutputStream& s, const ZMT::IFlowItemTypeInfo& i
                           const ZMT::ISchema& schema) {
   return PutString(s, info.m_Name) && PutU32(s, info.m_TypeId) &&
          PutU32(s, info.m_Version.m_Major) && PutU32(s, info.m_Version.m_Minor) &&
-         PutU32(s, info.m_Version.m_Patch) && PutString(s, info.m_Description) &&
-         Encode(s, schema);
+         PutU32(s, info.m_Version.m_Patch) && PutString(s, info.m_Description) && Encode(s, schema);
 }
 
 bool DecodeTypeDefinition(VByteCursor& c, ZMT::IFlowItemTypeInfo& o_rInfo,

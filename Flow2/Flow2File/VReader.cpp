@@ -54,7 +54,8 @@ bool VReader::ReadHeader(std::uint64_t position, VChunkHeader& o_rHeader) {
 }
 
 bool VReader::ReadPayload(std::uint64_t position, const VChunkHeader& header) {
-  if (position > m_Size || m_Size - position < Format::ChunkHeaderSize + std::uint64_t(header.m_PayloadSize))
+  if (position > m_Size ||
+      m_Size - position < Format::ChunkHeaderSize + std::uint64_t(header.m_PayloadSize))
     return false;
   m_Payload.resize(header.m_PayloadSize);
   return ReadAt(position + Format::ChunkHeaderSize, m_Payload.data(), header.m_PayloadSize);
@@ -84,7 +85,8 @@ IResult VReader::Open(ZMT::IInputStreamSeekable* i_pStream) {
   cursor.Get(magicSize);
   cursor.Read(magic, sizeof magic);
   cursor.Read(fields, sizeof fields);
-  if (magicSize != sizeof Format::Magic || !std::equal(magic, magic + sizeof magic, Format::Magic) ||
+  if (magicSize != sizeof Format::Magic ||
+      !std::equal(magic, magic + sizeof magic, Format::Magic) ||
       fields[3] != Format::TicksPerSecond) {
     Close();
     return IResult::InvalidFormat;
@@ -314,13 +316,11 @@ const VReader::VFileType* VReader::Type(std::uint32_t typeId) const {
 }
 
 IResult VReader::FindState(const ZMT::VFlowTimestamp& time, std::size_t& o_rIndex) const {
-  auto it = std::upper_bound(m_Index.begin(), m_Index.end(), time,
-                             [](const ZMT::VFlowTimestamp& t, const VStateEntry& e) {
-                               return t.m_Session != e.m_Session ? t.m_Session < e.m_Session
-                                                                 : t.m_Tick < e.m_Tick;
-                             });
-  if (it == m_Index.begin() || std::prev(it)->m_Session != time.m_Session)
-    return IResult::NotFound;
+  auto it = std::upper_bound(
+      m_Index.begin(), m_Index.end(), time, [](const ZMT::VFlowTimestamp& t, const VStateEntry& e) {
+        return t.m_Session != e.m_Session ? t.m_Session < e.m_Session : t.m_Tick < e.m_Tick;
+      });
+  if (it == m_Index.begin() || std::prev(it)->m_Session != time.m_Session) return IResult::NotFound;
   o_rIndex = static_cast<std::size_t>(std::prev(it) - m_Index.begin());
   return IResult::Ok;
 }
@@ -452,8 +452,9 @@ IResult VReader::ReadState(std::size_t index, ZMT::IFlowStateHandle& o_rState) {
     const VFileType* pType = Type(typeId);
     if (!pType || !pType->m_Reader) {
       // Items of a type the file doesn't define, or that can't be read here: left out.
-      if (!pType) Problem("state" + At(entry.m_Position) + ": type " + std::to_string(typeId) +
-                          " has no definition");
+      if (!pType)
+        Problem("state" + At(entry.m_Position) + ": type " + std::to_string(typeId) +
+                " has no definition");
       partial = true;
       read += groupCount;
       position = groupEnd + (byReference ? 0 : bodySize);

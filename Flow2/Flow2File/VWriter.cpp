@@ -29,8 +29,10 @@ IResult VWriter::Open(ZMT::IOutputStreamSeekable* i_pStream) {
   if (!i_pStream->GetPosition(start)) return IResult::FileIOFailure;
   m_pSeekable = i_pStream;
   IResult result = OpenCommon(start);
-  if (result.IsSuccess()) result = WriteTable(EChunkType::TypeTable, m_PendingTypes, m_LastTypeTable);
-  if (result.IsSuccess()) result = WriteTable(EChunkType::ItemTable, m_PendingItems, m_LastItemTable);
+  if (result.IsSuccess())
+    result = WriteTable(EChunkType::TypeTable, m_PendingTypes, m_LastTypeTable);
+  if (result.IsSuccess())
+    result = WriteTable(EChunkType::ItemTable, m_PendingItems, m_LastItemTable);
   if (result.IsFailure()) Reset();
   return result;
 }
@@ -49,8 +51,8 @@ IResult VWriter::OpenCommon(std::uint64_t start) {
   m_Position = 0;
   if (!BeginChunk(EChunkType::FileHeader, 0)) return IResult::AllocationFailure;
   const std::uint32_t magicSize = sizeof Format::Magic;
-  const std::uint32_t fields[4] = {Format::VersionMajor, Format::VersionMinor,
-                                   Format::VersionPatch, Format::TicksPerSecond};
+  const std::uint32_t fields[4] = {Format::VersionMajor, Format::VersionMinor, Format::VersionPatch,
+                                   Format::TicksPerSecond};
   m_Chunk.Write(&magicSize, 4);
   m_Chunk.Write(Format::Magic, sizeof Format::Magic);
   m_Chunk.Write(fields, sizeof fields);
@@ -312,8 +314,9 @@ IResult VWriter::FlushGroup() {
   if (!m_Group.m_Active) return IResult::Ok;
   m_Group.m_Active = false;
   const bool hasTime = !m_Group.m_Time.IsEmpty();
-  const auto flags = static_cast<std::uint16_t>((m_Group.m_ByReference ? Format::GroupByReference : 0) |
-                                                (hasTime ? Format::GroupHasTime : 0));
+  const auto flags =
+      static_cast<std::uint16_t>((m_Group.m_ByReference ? Format::GroupByReference : 0) |
+                                 (hasTime ? Format::GroupHasTime : 0));
   IResult result = IResult::Ok;
   if (!BeginChunk(EChunkType::ItemGroup, flags)) {
     result = IResult::AllocationFailure;
@@ -337,7 +340,8 @@ IResult VWriter::FlushGroup() {
         m_Chunk.Write(&bodySize, 4);
         if (!m_Store) {
           m_BodyGather.clear();
-          for (const ZMT::IFlowBufferConst* pPage = m_Bodies.Head(); pPage; pPage = pPage->GetNext())
+          for (const ZMT::IFlowBufferConst* pPage = m_Bodies.Head(); pPage;
+               pPage = pPage->GetNext())
             if (pPage->GetSize()) m_BodyGather.emplace_back(pPage->GetData(), pPage->GetSize());
         }
         result = FinishChunk(&m_BodyGather, m_BodyBytes, false);
@@ -396,15 +400,17 @@ IResult VWriter::WriteState(const ZMT::IFlowState& state) {
     if (mapped == m_WrittenTypes.end()) return IResult::Failed;
     if (mapped->second < 0) continue;
     const auto fileTypeId = static_cast<std::uint32_t>(mapped->second);
-    const ZMT::VFlowTimestamp itemTime = record.m_Time == time ? ZMT::VFlowTimestamp() : record.m_Time;
+    const ZMT::VFlowTimestamp itemTime =
+        record.m_Time == time ? ZMT::VFlowTimestamp() : record.m_Time;
     std::uint64_t position = 0;
     const bool byReference = m_Positions.Find(record.m_Token, position);
-    if (!m_Group.m_Active || m_Group.m_FileTypeId != fileTypeId ||
-        !(m_Group.m_Time == itemTime) || m_Group.m_FlowStoreId != record.m_Token.m_FlowStoreId ||
+    if (!m_Group.m_Active || m_Group.m_FileTypeId != fileTypeId || !(m_Group.m_Time == itemTime) ||
+        m_Group.m_FlowStoreId != record.m_Token.m_FlowStoreId ||
         m_Group.m_ByReference != byReference) {
       result = FlushGroup();
       if (result.IsFailure()) return result;
-      m_Group = VPendingGroup{true, fileTypeId, record.m_Token.m_FlowStoreId, itemTime, byReference, 0};
+      m_Group =
+          VPendingGroup{true, fileTypeId, record.m_Token.m_FlowStoreId, itemTime, byReference, 0};
       m_BodyOffset = itemTime.IsEmpty() ? Format::GroupSize : Format::GroupSizeWithTime;
     }
     if (byReference) {

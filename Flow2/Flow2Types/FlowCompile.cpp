@@ -22,7 +22,8 @@ using VRenames = std::vector<std::pair<std::string, std::string>>;
 /// Brings the file's names to their local form through the two rename histories: entries both
 /// have must agree; newer local entries apply forward (oldest first), newer file entries backward
 /// (newest first). False when the common entries differ.
-bool ApplyHistory(const VRenames& file, const VRenames& local, std::vector<std::string>& io_rNames) {
+bool ApplyHistory(const VRenames& file, const VRenames& local,
+                  std::vector<std::string>& io_rNames) {
   const std::size_t common = std::min(file.size(), local.size());
   for (std::size_t i = 0; i < common; ++i)
     if (file[i] != local[i]) return false;
@@ -120,15 +121,13 @@ IReaderPtr CompileNode(const ISchema& file, const ISchema& local, const IReaderI
   if (IsEnum(file.m_Type) && IsEnum(local.m_Type)) {
     VEnumMap map;
     if (!MapEnum(file, local, map, nullptr, {})) return nullptr;
-    const bool identity =
-        map.m_Ignored.empty() &&
-        std::all_of(map.m_Pairs.begin(), map.m_Pairs.end(),
-                    [](const auto& pair) { return pair.first == pair.second; });
+    const bool identity = map.m_Ignored.empty() &&
+                          std::all_of(map.m_Pairs.begin(), map.m_Pairs.end(),
+                                      [](const auto& pair) { return pair.first == pair.second; });
     if (identity) return info.m_Create(params);
-    return std::make_shared<IO::VReaderMappedEnum>(offset, ISchema::ScalarSize(file.m_Type),
-                                                   ISchema::ScalarSize(local.m_Type),
-                                                   std::move(map.m_Ignored),
-                                                   std::move(map.m_Pairs));
+    return std::make_shared<IO::VReaderMappedEnum>(
+        offset, ISchema::ScalarSize(file.m_Type), ISchema::ScalarSize(local.m_Type),
+        std::move(map.m_Ignored), std::move(map.m_Pairs));
   }
 
   if (file.m_Members.size() != local.m_Members.size() ||
@@ -155,8 +154,9 @@ void CompareNode(const ISchema& a, const ISchema& b, const std::string& path,
   const std::string where = path.empty() ? std::string(a.m_Name) : path;
   if (a.m_Type != b.m_Type) {
     if (IsEnum(a.m_Type) && IsEnum(b.m_Type)) {
-      o_rWarnings.push_back(where + ": Type changed from " + std::string(ISchema::TypeName(a.m_Type)) +
-                            " to " + std::string(ISchema::TypeName(b.m_Type)));
+      o_rWarnings.push_back(where + ": Type changed from " +
+                            std::string(ISchema::TypeName(a.m_Type)) + " to " +
+                            std::string(ISchema::TypeName(b.m_Type)));
     } else {
       (AcceptsFileType(b.m_Type, a.m_Type) ? o_rWarnings : o_rErrors)
           .push_back(where + ": Type changed from " + std::string(ISchema::TypeName(a.m_Type)) +
@@ -272,8 +272,8 @@ IReaderPtr Collapse(std::vector<IReaderPtr> children, std::uint64_t offset, std:
         out.back()->m_Offset != IReaderCollapsable::NoOffset &&
         out.back()->m_Offset + out.back()->m_Size == pChild->m_Offset &&
         std::uint64_t(out.back()->m_Size) + pChild->m_Size <= 0xFFFFFFFFu) {
-      out.back() = std::make_shared<VReaderBytes>(out.back()->m_Offset,
-                                                  out.back()->m_Size + pChild->m_Size);
+      out.back() =
+          std::make_shared<VReaderBytes>(out.back()->m_Offset, out.back()->m_Size + pChild->m_Size);
     } else {
       out.push_back(std::move(pChild));
     }

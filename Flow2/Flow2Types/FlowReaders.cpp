@@ -12,8 +12,7 @@ constexpr std::uint64_t SkipPiece = 4096;
 IResult SkipThrough(IInputStream& io_rStream, std::vector<std::uint8_t>& io_rScratch,
                     std::uint64_t size) {
   if (size == 0) return IResult::OkButNoEffect;
-  if (io_rScratch.size() < std::min(size, SkipPiece))
-    io_rScratch.resize(std::min(size, SkipPiece));
+  if (io_rScratch.size() < std::min(size, SkipPiece)) io_rScratch.resize(std::min(size, SkipPiece));
   while (size > 0) {
     const std::uint64_t piece = std::min<std::uint64_t>(size, io_rScratch.size());
     if (!io_rStream.Read(io_rScratch.data(), piece)) return IResult::Failed;
@@ -28,7 +27,8 @@ bool TakesNoBytes(const ISchema& node) {
   case ISchema::Void:
     return true;
   case ISchema::Array:
-    return node.m_Count == 0 || (node.m_Members.size() == 1 && TakesNoBytes(node.m_Members[0].m_Schema));
+    return node.m_Count == 0 ||
+           (node.m_Members.size() == 1 && TakesNoBytes(node.m_Members[0].m_Schema));
   case ISchema::Tuple:
   case ISchema::NamedTuple:
   case ISchema::Ref:
@@ -131,8 +131,7 @@ IReaderPtr MakeSkip(const ISchema& node) {
     if (node.m_Members.size() != 1) return nullptr;
     IReaderPtr pElement = MakeSkip(node.m_Members[0].m_Schema);
     if (!pElement) return nullptr;
-    if (const std::uint64_t size = FixedSkipSize(pElement))
-      return SkipOf(size * node.m_Count);
+    if (const std::uint64_t size = FixedSkipSize(pElement)) return SkipOf(size * node.m_Count);
     return std::make_shared<VReaderSkipArray>(node.m_Count, std::move(pElement));
   }
   case ISchema::List: {

@@ -34,7 +34,8 @@ ZMT::IResult VMemoryMappedInputFile::Open(const boost::filesystem::path& path) {
   errno = 0;
   const int file = ::open(PlatformPath(path).c_str(), O_RDONLY | O_CLOEXEC);
   if (file < 0)
-    return OpenFailureOf(path, errno, "Failed to open output file '%1%' locked by processes '%2%'.");
+    return OpenFailureOf(path, errno,
+                         "Failed to open output file '%1%' locked by processes '%2%'.");
   struct stat status {};
   if (::fstat(file, &status) != 0) {
     const int error = errno;

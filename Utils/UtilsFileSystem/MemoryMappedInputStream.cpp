@@ -32,8 +32,8 @@ VMemoryMappedInputStream::VMemoryMappedInputStream(const boost::filesystem::path
 
 VMemoryMappedInputStream::VMemoryMappedInputStream(VMemoryMappedInputStream&& other) noexcept
     : m_File(std::move(other.m_File)), m_Pages(std::move(other.m_Pages)),
-      m_PageSize(other.m_PageSize), m_MaxPages(other.m_MaxPages),
-      m_SwapCount(other.m_SwapCount), m_Position(other.m_Position), m_Failed(other.m_Failed) {
+      m_PageSize(other.m_PageSize), m_MaxPages(other.m_MaxPages), m_SwapCount(other.m_SwapCount),
+      m_Position(other.m_Position), m_Failed(other.m_Failed) {
   other.m_Pages.clear();
 }
 
@@ -54,8 +54,9 @@ void VMemoryMappedInputStream::Close() {
     VMemoryMappedInputFile::Unmap(page.m_pData, page.m_Size);
   m_Pages.clear();
   if (m_File.IsOpen()) {
-    ZMT_LOG("System", ZMT::ELogVerbose, "VMemoryMappedInputStream stats: %1% swaps, %2% pages in file.",
-            m_SwapCount, m_File.GetFileSize() / m_PageSize + 1);
+    ZMT_LOG("System", ZMT::ELogVerbose,
+            "VMemoryMappedInputStream stats: %1% swaps, %2% pages in file.", m_SwapCount,
+            m_File.GetFileSize() / m_PageSize + 1);
     m_File.Close();
   }
 }
@@ -144,12 +145,11 @@ IInputStreamSeekableOwningAdapter<VMemoryMappedInputStream>::IInputStreamSeekabl
   if (!m_Stream.IsOpen()) throw std::runtime_error("Invalid stream");
 }
 
-VInputStreamOpenResult OpenInputStream(const boost::filesystem::path& path,
-                                       std::uint64_t pageSize, std::uint32_t maxPages) {
+VInputStreamOpenResult OpenInputStream(const boost::filesystem::path& path, std::uint64_t pageSize,
+                                       std::uint32_t maxPages) {
   VMemoryMappedInputStream mapped(pageSize, maxPages);
   if (mapped.Open(path).IsSuccess())
-    return {std::make_unique<VMemoryMappedInputStreamVirtual>(std::move(mapped)),
-            ZMT::IResult::Ok};
+    return {std::make_unique<VMemoryMappedInputStreamVirtual>(std::move(mapped)), ZMT::IResult::Ok};
   auto [pFile, result] = OpenInputFile(path, true);
   if (!pFile) return {nullptr, result};
   return {std::make_unique<VFileInputStreamVirtual>(VFileInputStream(pFile)), ZMT::IResult::Ok};

@@ -104,8 +104,9 @@ using VInputStreamOpenResult = std::pair<std::unique_ptr<ZMT::IInputStreamSeekab
 
 /// A file for reading: mapped if it can be, else through a plain file stream; null with the code
 /// when neither opens.
-VInputStreamOpenResult OpenInputStream(const boost::filesystem::path& path,
-                                       std::uint64_t pageSize = VMemoryMappedInputStream::DefaultPageSize,
-                                       std::uint32_t maxPages = VMemoryMappedInputStream::DefaultMaxPages);
+VInputStreamOpenResult
+OpenInputStream(const boost::filesystem::path& path,
+                std::uint64_t pageSize = VMemoryMappedInputStream::DefaultPageSize,
+                std::uint32_t maxPages = VMemoryMappedInputStream::DefaultMaxPages);
 
 } // namespace UtilsFileSystem

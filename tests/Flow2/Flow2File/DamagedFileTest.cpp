@@ -88,8 +88,8 @@ TEST_F(VDamage, ACutAtAnyChunkBoundaryOrInsideAChunkKeepsTheStatesBefore) {
     }
     EXPECT_EQ(outcome.m_Open, IResult(IResult::OkButPartial)) << "cut at " << cut;
     EXPECT_FALSE(outcome.m_Problems.empty());
-    const auto whole = std::size_t(std::count_if(ends.begin(), ends.end(),
-                                                 [&](std::uint64_t end) { return end <= cut; }));
+    const auto whole = std::size_t(
+        std::count_if(ends.begin(), ends.end(), [&](std::uint64_t end) { return end <= cut; }));
     ASSERT_GE(outcome.m_States.size(), whole) << "cut at " << cut;
     for (std::size_t i = 0; i < whole; ++i) {
       EXPECT_EQ(outcome.m_States[i], IResult(IResult::Ok)) << "cut at " << cut << ", state " << i;
@@ -135,8 +135,7 @@ TEST_F(VDamage, ABrokenIndexLinkFallsBackToWalkingTheRest) {
     const VOutcome outcome = ReadAll(bytes);
     EXPECT_EQ(outcome.m_Open, IResult(IResult::OkButPartial));
     ASSERT_FALSE(outcome.m_Problems.empty());
-    EXPECT_NE(outcome.m_Problems[0].find("index link"), std::string::npos)
-        << outcome.m_Problems[0];
+    EXPECT_NE(outcome.m_Problems[0].find("index link"), std::string::npos) << outcome.m_Problems[0];
     ASSERT_EQ(outcome.m_States.size(), std::size_t(Frames));
     for (int i = 0; i < Frames; ++i) {
       EXPECT_EQ(outcome.m_States[std::size_t(i)], IResult(IResult::Ok));

@@ -59,13 +59,15 @@ struct VSide {
   }
   template <class T> ZMT::IFlowItemHandle Create() {
     ZMT::IFlowItemHandle item;
-    EXPECT_TRUE(m_Store->CreateItem(ZMT::Detail::FlowTypeStatics<T>().m_TypeInfo, item).IsSuccess());
+    EXPECT_TRUE(
+        m_Store->CreateItem(ZMT::Detail::FlowTypeStatics<T>().m_TypeInfo, item).IsSuccess());
     return item;
   }
   ZMT::IFlowStateHandle State(std::int64_t frame, std::uint32_t session = 1) {
     ZMT::IFlowStateHandle state;
-    EXPECT_TRUE(m_States->CreateState(state, {frame * Period, std::uint64_t(Period), session}, {}, {})
-                    .IsSuccess());
+    EXPECT_TRUE(
+        m_States->CreateState(state, {frame * Period, std::uint64_t(Period), session}, {}, {})
+            .IsSuccess());
     return state;
   }
   Flow2File::VReader Reader() { return Flow2File::VReader(m_Store, m_Buffers, m_States); }

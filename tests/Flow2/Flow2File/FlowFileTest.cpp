@@ -154,7 +154,8 @@ TEST(FlowFile, SeekingByTimeReadsAHandfulOfChunks) {
   EXPECT_EQ(ValueAt<std::uint64_t>(out.Bytes(), indexes[0].m_Position + 8), indexes[1].m_Position);
   EXPECT_EQ(ValueAt<std::uint64_t>(out.Bytes(), indexes[1].m_Position + 8), indexes[2].m_Position);
   EXPECT_EQ(ValueAt<std::uint32_t>(out.Bytes(), indexes[1].m_Position + 8 + 84), 10000u);
-  EXPECT_EQ(ValueAt<std::uint64_t>(out.Bytes(), indexes[2].m_Position + 8 + 68), std::uint64_t(Frames));
+  EXPECT_EQ(ValueAt<std::uint64_t>(out.Bytes(), indexes[2].m_Position + 8 + 68),
+            std::uint64_t(Frames));
 
   VSide reading(88);
   Flow2File::VReader reader = reading.Reader();

@@ -43,7 +43,8 @@ TEST(FlowMappedFile, ARecordingOnDiskReadsBackThroughSwappedPages) {
       ZMT::IFlowStateHandle state = again.State(std::int64_t(f));
       for (int i = 0; i < 3; ++i) {
         auto point = again.Create<VFlowTestPoint>();
-        static_cast<VPoint&>(*point.As<PointItem>()) = *recording.m_Frames[f][std::size_t(i)].As<PointItem>();
+        static_cast<VPoint&>(*point.As<PointItem>()) =
+            *recording.m_Frames[f][std::size_t(i)].As<PointItem>();
         state->AddItem(point);
       }
       auto event = again.Create<VFlowTestEvent>();

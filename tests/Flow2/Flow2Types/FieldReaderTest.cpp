@@ -122,7 +122,8 @@ struct VNew {
 };
 
 TEST(FlowFieldReaders, AnUnchangedLayoutReadsAsOneBlockCopy) {
-  ZMT::IReaderPtr pReader = ZMT::CompileReader<VMarker32>(SchemaOf<VMarker32>(), SchemaOf<VMarker32>());
+  ZMT::IReaderPtr pReader =
+      ZMT::CompileReader<VMarker32>(SchemaOf<VMarker32>(), SchemaOf<VMarker32>());
   ASSERT_TRUE(pReader);
   auto* pBytes = dynamic_cast<VReaderBytes*>(pReader.get());
   ASSERT_NE(pBytes, nullptr);
@@ -176,7 +177,8 @@ TEST(FlowFieldReaders, AnOlderVersionReadsIntoTheNewerOne) {
   EXPECT_EQ(now.m_Added, 42u); // not in the file: the default stays
 
   // Where the layouts agree the compiled reader is a block copy: X, Y and Z as one.
-  ZMT::IReaderPtr pReader = ZMT::CompileReader<VSampleV2>(SchemaOf<VSampleV1>(), SchemaOf<VSampleV2>());
+  ZMT::IReaderPtr pReader =
+      ZMT::CompileReader<VSampleV2>(SchemaOf<VSampleV1>(), SchemaOf<VSampleV2>());
   auto* pTuple = dynamic_cast<VReaderTuple*>(pReader.get());
   ASSERT_NE(pTuple, nullptr);
   auto* pFirst = dynamic_cast<VReaderBytes*>(pTuple->Children()[0].get());
@@ -229,17 +231,18 @@ TEST(FlowFieldReaders, RenamedMembersAreFoundThroughTheHistoryBothWays) {
 TEST(FlowFieldReaders, EnumValuesMapByNameAndUnknownNamesFail) {
   ISchema file = SchemaOf<VSampleV2>();
   // A value the local enum lacks can't be mapped.
-  auto& colour = std::find_if(file.m_Members.begin(), file.m_Members.end(),
-                              [](const auto& m) { return m.m_Name == "Colour"; })
-                     ->m_Schema;
+  auto& colour = std::find_if(file.m_Members.begin(), file.m_Members.end(), [](const auto& m) {
+                   return m.m_Name == "Colour";
+                 })->m_Schema;
   colour.m_EnumValues.push_back({"Orange", 4});
   EXPECT_FALSE(ZMT::CompileReader<VSampleV1>(file, SchemaOf<VSampleV1>()));
 
   // A value the history retires (renamed to nothing) reads to no effect.
   ISchema retiring = SchemaOf<VSampleV2>();
-  auto& values = std::find_if(retiring.m_Members.begin(), retiring.m_Members.end(),
-                              [](const auto& m) { return m.m_Name == "Colour"; })
-                     ->m_Schema;
+  auto& values =
+      std::find_if(retiring.m_Members.begin(), retiring.m_Members.end(), [](const auto& m) {
+        return m.m_Name == "Colour";
+      })->m_Schema;
   ISchema localEnum = values;
   localEnum.m_EnumValues.pop_back(); // no Purple here
   localEnum.m_Renames.push_back({"Purple", ""});
@@ -282,9 +285,9 @@ TEST(FlowFieldReaders, CompareSchemasNamesEachChange) {
   errors.clear();
   warnings.clear();
   ZMT::CompareSchemas(SchemaOf<VSampleV2>(), SchemaOf<VSampleV1>(), errors, warnings);
-  EXPECT_NE(std::find(errors.begin(), errors.end(),
-                      "Sample.Count: Type changed from Int32 to Int16"),
-            errors.end());
+  EXPECT_NE(
+      std::find(errors.begin(), errors.end(), "Sample.Count: Type changed from Int32 to Int16"),
+      errors.end());
   ISchema longer = SchemaOf<VNested>();
   longer.m_Members[1].m_Schema.m_Count = 3;
   errors.clear();
