@@ -326,7 +326,8 @@ IResult VReader::FindState(const ZMT::VFlowTimestamp& time, std::size_t& o_rInde
 }
 
 IResult VReader::ReadBody(std::uint64_t position, std::uint64_t size, const VFileType& type,
-                          const ZMT::IFlowItemToken& token, ZMT::IFlowItemHandle& o_rItem) {
+                          const ZMT::IFlowItemToken& token, ZMT::IFlowItemHandle& o_rItem,
+                          const std::uint8_t* i_pBytes) {
   ZMT::IFlowBuffer* pChain = nullptr;
   try {
     pChain = m_Buffers->AllocateChain(size);
@@ -334,15 +335,21 @@ IResult VReader::ReadBody(std::uint64_t position, std::uint64_t size, const VFil
     pChain = nullptr;
   }
   if (!pChain) return IResult::AllocationFailure;
-  if (!m_pStream->Seek(static_cast<std::int64_t>(m_Start + position))) {
+  if (!i_pBytes && !m_pStream->Seek(static_cast<std::int64_t>(m_Start + position))) {
     pChain->ReleaseChain();
     return IResult::FileIOFailure;
   }
-  for (ZMT::IFlowBuffer* pPage = pChain; pPage; pPage = pPage->GetMutableNext())
-    if (pPage->GetSize() && !m_pStream->Read(pPage->GetMutableData(), pPage->GetSize())) {
+  for (ZMT::IFlowBuffer* pPage = pChain; pPage; pPage = pPage->GetMutableNext()) {
+    const std::uint64_t piece = pPage->GetSize();
+    if (!piece) continue;
+    if (i_pBytes) {
+      std::memcpy(pPage->GetMutableData(), i_pBytes, piece);
+      i_pBytes += piece;
+    } else if (!m_pStream->Read(pPage->GetMutableData(), piece)) {
       pChain->ReleaseChain();
       return IResult::FileIOFailure;
     }
+  }
   IResult result = IResult::Ok;
   try {
     result = type.m_Reader(token, pChain, o_rItem);
@@ -469,25 +476,34 @@ IResult VReader::ReadState(std::size_t index, ZMT::IFlowStateHandle& o_rState) {
       }
       position = groupEnd;
     } else {
+      // The group's items are read in one piece and taken apart in memory.
       position = groupEnd;
-      const std::uint64_t bodiesEnd = groupEnd + bodySize;
+      if (bodySize > m_Size - groupEnd) return damaged("the file ends inside an item group");
+      m_Bodies.resize(bodySize);
+      if (!ReadAt(groupEnd, m_Bodies.data(), bodySize))
+        return damaged("an item group is cut short");
+      std::uint64_t offset = 0;
       for (std::uint32_t i = 0; i < groupCount; ++i) {
-        if (!ReadHeader(position, header) || header.m_Type != std::uint16_t(EChunkType::ItemData) ||
-            header.m_PayloadSize < 4 ||
-            position + Format::ChunkHeaderSize + header.m_PayloadSize > bodiesEnd)
+        ++m_ChunksRead;
+        if (bodySize - offset < Format::ChunkHeaderSize + 4)
+          return damaged("an item is missing or damaged");
+        header.Decode(m_Bodies.data() + offset);
+        if (header.m_Type != std::uint16_t(EChunkType::ItemData) || header.m_PayloadSize < 4 ||
+            header.m_PayloadSize > bodySize - offset - Format::ChunkHeaderSize)
           return damaged("an item is missing or damaged");
         ZMT::IFlowItemToken token(0, typeId, flowStoreId);
-        if (!ReadAt(position + Format::ChunkHeaderSize, &token.m_ItemId, 4))
-          return damaged("an item is cut short");
+        std::memcpy(&token.m_ItemId, m_Bodies.data() + offset + Format::ChunkHeaderSize, 4);
+        const std::uint64_t body = offset + Format::ChunkHeaderSize + 4;
         ZMT::IFlowItemHandle item;
-        if (ReadBody(position + Format::ChunkHeaderSize + 4, header.m_PayloadSize - 4, *pType,
-                     token, item)
+        if (ReadBody(groupEnd + body, header.m_PayloadSize - 4, *pType, token, item,
+                     m_Bodies.data() + body)
                 .IsFailure() ||
             !o_rState->AddItem(item, itemTime))
           partial = true;
-        position += Format::ChunkHeaderSize + header.m_PayloadSize;
+        offset += Format::ChunkHeaderSize + header.m_PayloadSize;
+        position = groupEnd + offset;
       }
-      if (position != bodiesEnd) return damaged("item bodies don't match their group's size");
+      if (offset != bodySize) return damaged("item bodies don't match their group's size");
     }
     read += groupCount;
   }

@@ -86,8 +86,10 @@ private:
   bool ParseSessionIndex(std::uint64_t position, const VChunkHeader& header, bool takeEntries);
   /// Walks chunks from `position` to the end, gathering what the index lacks.
   void Scan(std::uint64_t position);
+  /// Makes the item of a body at `position`: from `i_pBytes` when given, else from the stream.
   ZMT::IResult ReadBody(std::uint64_t position, std::uint64_t size, const VFileType& type,
-                        const ZMT::IFlowItemToken& token, ZMT::IFlowItemHandle& o_rItem);
+                        const ZMT::IFlowItemToken& token, ZMT::IFlowItemHandle& o_rItem,
+                        const std::uint8_t* i_pBytes = nullptr);
   /// The item of an ItemData or StaticItem chunk another group refers to.
   ZMT::IResult ReadReferenced(std::uint64_t position, std::uint32_t typeId,
                               std::uint64_t flowStoreId, ZMT::IFlowItemHandle& o_rItem);
@@ -102,6 +104,8 @@ private:
   std::uint64_t m_ChunksRead = 0;
   bool m_Complete = false;
   std::vector<std::uint8_t> m_Payload;
+  /// The item chunks of one group.
+  std::vector<std::uint8_t> m_Bodies;
   std::map<std::uint32_t, VFileType> m_Types;
   std::vector<std::uint64_t> m_TypePositions;
   std::vector<std::uint64_t> m_StaticPositions;

@@ -14,6 +14,10 @@ VWriter::VWriter(ZMT::IFlowBufferFactoryHandle buffers, ZMT::IFlowStoreHandle st
     : m_Store(std::move(store)), m_Buffers(std::move(buffers)), m_Chunk(*m_Buffers),
       m_Bodies(*m_Buffers) {}
 
+void VWriter::SetUseStoreBuffers(bool use) {
+  m_UseStoreBuffers = use && m_Store;
+}
+
 VWriter::~VWriter() {
   if (IsOpen()) Close();
 }
@@ -282,7 +286,7 @@ IResult VWriter::AddBody(const ZMT::IFlowItemHandle& item) {
     return IResult::AllocationFailure;
   std::uint64_t size = 0;
   bool shared = false;
-  if (m_Store) {
+  if (m_UseStoreBuffers) {
     m_BodyGather.emplace_back(pHeader, Format::ChunkHeaderSize + 4);
     const IResult result = BodyPieces(item, m_BodyGather, size, shared);
     if (result.IsFailure()) return result;
@@ -338,7 +342,7 @@ IResult VWriter::FlushGroup() {
       } else {
         const auto bodySize = static_cast<std::uint32_t>(m_BodyBytes);
         m_Chunk.Write(&bodySize, 4);
-        if (!m_Store) {
+        if (!m_UseStoreBuffers) {
           m_BodyGather.clear();
           for (const ZMT::IFlowBufferConst* pPage = m_Bodies.Head(); pPage;
                pPage = pPage->GetNext())
@@ -455,7 +459,7 @@ IResult VWriter::WriteItems(const std::vector<ZMT::IFlowItemHandle>& items, bool
     m_Chunk.Write(&token.m_ItemId, 4);
     m_Chunk.Write(&fileTypeId, 4);
     m_Chunk.Write(&token.m_FlowStoreId, 8);
-    if (m_Store) {
+    if (m_UseStoreBuffers) {
       result = BodyPieces(item, body, size, shared);
       if (result.IsFailure()) return result;
     } else {

@@ -24,9 +24,14 @@ namespace Flow2File {
 
 class VWriter {
 public:
-  /// With a store, item bodies are the store's cached bytes, linked in by reference, and items of
-  /// types unknown here can be written; without one, items serialise themselves.
+  /// With a store, items of types unknown here can be written. Items serialise themselves into the
+  /// writer's pages (a shared buffer an item writes passes by reference).
   explicit VWriter(ZMT::IFlowBufferFactoryHandle buffers, ZMT::IFlowStoreHandle store = {});
+  /// With a store: take item bodies from the store's cached bytes (made once per item and kept on
+  /// its entry), linked in by reference. Worth it when items go to several files; each body then
+  /// takes a page of its own, which makes a state of small items slower to write. The file is the
+  /// same either way.
+  void SetUseStoreBuffers(bool use);
   /// Closes, swallowing any failure.
   ~VWriter();
   VWriter(const VWriter&) = delete;
@@ -129,6 +134,7 @@ private:
   Flow2Store::VFlowOutputStream m_Chunk;
   Flow2Store::VFlowOutputStream m_Bodies;
   std::uint8_t* m_pChunkHeader = nullptr;
+  bool m_UseStoreBuffers = false;
   VChunkHeader m_ChunkHeader;
 };
 

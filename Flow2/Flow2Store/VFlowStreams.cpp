@@ -14,13 +14,16 @@ VFlowOutputStream::~VFlowOutputStream() {
 }
 
 bool VFlowOutputStream::AddPage() {
+  Sync();
+  m_pFill = nullptr;
   ZMT::IFlowBuffer* pPage = nullptr;
   try {
     pPage = m_rFactory.AllocatePage();
   } catch (const std::exception&) {
     pPage = nullptr;
   }
-  if (!pPage) {
+  if (!pPage || !pPage->GetMutableData()) {
+    if (pPage) pPage->Release();
     m_Failed = true;
     return false;
   }
@@ -29,24 +32,27 @@ bool VFlowOutputStream::AddPage() {
   else
     m_pHead = pPage;
   m_pTail = pPage;
+  m_pFill = pPage;
+  m_pFillData = pPage->GetMutableData();
+  m_Used = pPage->GetSize();
+  m_Capacity = pPage->GetCapacity();
   return true;
 }
 
 bool VFlowOutputStream::Write(const void* pBuffer, std::uint64_t size) {
   if (m_Failed) return false;
   m_Total += size;
+  if (m_pFill && size <= m_Capacity - m_Used) { // the usual small write
+    std::memcpy(m_pFillData + m_Used, pBuffer, size);
+    m_Used += size;
+    return true;
+  }
   const auto* pBytes = static_cast<const std::uint8_t*>(pBuffer);
   while (size > 0) {
-    if ((!m_pTail || m_pTail->GetSize() == m_pTail->GetCapacity()) && !AddPage()) return false;
-    std::uint8_t* pData = m_pTail->GetMutableData();
-    const std::uint64_t used = m_pTail->GetSize();
-    const std::uint64_t piece = std::min(size, m_pTail->GetCapacity() - used);
-    if (!pData) {
-      m_Failed = true;
-      return false;
-    }
-    std::memcpy(pData + used, pBytes, piece);
-    m_pTail->SetSize(used + piece);
+    if ((!m_pFill || m_Used == m_Capacity) && !AddPage()) return false;
+    const std::uint64_t piece = std::min(size, m_Capacity - m_Used);
+    std::memcpy(m_pFillData + m_Used, pBytes, piece);
+    m_Used += piece;
     pBytes += piece;
     size -= piece;
   }
@@ -66,11 +72,13 @@ bool VFlowOutputStream::Write(const std::shared_ptr<const ZMT::IBufferConst>& i_
     m_Failed = true;
     return false;
   }
+  Sync();
+  m_pFill = nullptr; // the shared page is full by construction: the next byte starts a new page
   if (m_pTail)
     m_pTail->SetNext(pPage);
   else
     m_pHead = pPage;
-  m_pTail = pPage; // full by construction: the next byte starts a new page
+  m_pTail = pPage;
   m_Total += i_pBuffer->GetSize();
   ++m_SharedCount;
   return true;
@@ -78,18 +86,17 @@ bool VFlowOutputStream::Write(const std::shared_ptr<const ZMT::IBufferConst>& i_
 
 std::uint64_t VFlowOutputStream::GetScratch(void*& o_rpData, std::uint64_t size) {
   if (m_Failed || size == 0 || size > VFlowBufferFixed::Capacity) return 0;
-  if (!m_pTail || m_pTail->GetCapacity() - m_pTail->GetSize() < size || !m_pTail->GetMutableData())
-    if (!AddPage()) return 0;
-  const std::uint64_t used = m_pTail->GetSize();
-  std::uint8_t* pData = m_pTail->GetMutableData();
-  if (!pData || !m_pTail->SetSize(used + size)) return 0;
-  o_rpData = pData + used;
+  if ((!m_pFill || m_Capacity - m_Used < size) && !AddPage()) return 0;
+  o_rpData = m_pFillData + m_Used;
+  m_Used += size;
   m_Total += size;
   return size;
 }
 
 ZMT::IFlowBuffer* VFlowOutputStream::Detach() {
   if (m_Failed || (!m_pHead && !AddPage())) return nullptr;
+  Sync();
+  m_pFill = nullptr;
   m_pTail = nullptr;
   m_Total = 0;
   ZMT::IFlowBuffer* pHead = m_pHead;
@@ -98,6 +105,8 @@ ZMT::IFlowBuffer* VFlowOutputStream::Detach() {
 }
 
 ZMT::IFlowBuffer* VFlowOutputStream::TakeChain() {
+  Sync();
+  m_pFill = nullptr;
   ZMT::IFlowBuffer* pHead = m_pHead;
   m_pHead = m_pTail = nullptr;
   m_Total = 0;

@@ -33,14 +33,27 @@ public:
   /// starts afresh, failure flag included.
   ZMT::IFlowBuffer* TakeChain();
   /// The first page, null before the first byte (the file writer sets a chunk's size there).
-  ZMT::IFlowBuffer* Head() const { return m_pHead; }
+  ZMT::IFlowBuffer* Head() {
+    Sync();
+    return m_pHead;
+  }
 
 private:
   bool AddPage();
+  /// Gives the page being filled its size; writes keep it in m_Used meanwhile.
+  void Sync() {
+    if (m_pFill) m_pFill->SetSize(m_Used);
+  }
 
   ZMT::IFlowBufferFactory& m_rFactory;
   ZMT::IFlowBuffer* m_pHead = nullptr;
   ZMT::IFlowBuffer* m_pTail = nullptr;
+  /// The fixed page being filled, with its bytes, used size and capacity, so that a small write
+  /// is one copy; null when the tail is full or shared.
+  ZMT::IFlowBuffer* m_pFill = nullptr;
+  std::uint8_t* m_pFillData = nullptr;
+  std::uint64_t m_Used = 0;
+  std::uint64_t m_Capacity = 0;
   std::uint64_t m_Total = 0;
   std::uint64_t m_SharedCount = 0;
   bool m_Failed = false;

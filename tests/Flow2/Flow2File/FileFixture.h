@@ -88,6 +88,7 @@ struct VRecording {
   std::vector<std::uint8_t> m_Bytes;
 };
 
+/// `withStore`: bodies from the store's cached bytes rather than serialised by the writer.
 inline VRecording Record(VSide& side, int frames, bool withStore = true) {
   VRecording recording;
   recording.m_Shared = side.Create<VFlowTestMixed>();
@@ -98,7 +99,8 @@ inline VRecording Record(VSide& side, int frames, bool withStore = true) {
   pMixed->m_Points = {VPoint{1, 2, 3, 4}};
 
   UtilsFileSystem::VMemoryOutputStream out;
-  Flow2File::VWriter writer(side.m_Buffers, withStore ? side.m_Store : ZMT::IFlowStoreHandle());
+  Flow2File::VWriter writer(side.m_Buffers, side.m_Store);
+  writer.SetUseStoreBuffers(withStore);
   EXPECT_TRUE(writer.Open(&out).IsSuccess());
   for (int f = 0; f < frames; ++f) {
     ZMT::IFlowStateHandle state = side.State(f);

@@ -45,7 +45,7 @@ TEST(FlowFile, ItemsOfSeveralTypesReadBackEqual) {
   EXPECT_EQ(statics[0].GetToken(), recording.m_Shared.GetToken());
   EXPECT_EQ(Serialise(*statics[0]), Serialise(*recording.m_Shared));
 
-  // Items that serialise themselves make the same file as the store's cached bytes.
+  // Items serialised by the writer make the same file as the store's cached bytes.
   VSide plain(77);
   EXPECT_EQ(Record(plain, 40, false).m_Bytes, recording.m_Bytes);
 }
