@@ -41,6 +41,7 @@ bool VFlowOutputStream::AddPage() {
 
 bool VFlowOutputStream::Write(const void* pBuffer, std::uint64_t size) {
   if (m_Failed) return false;
+  if (size == 0) return true;
   m_Total += size;
   if (m_pFill && size <= m_Capacity - m_Used) { // the usual small write
     std::memcpy(m_pFillData + m_Used, pBuffer, size);
