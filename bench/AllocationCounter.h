@@ -11,6 +11,8 @@
 namespace Bench {
 inline std::atomic<int64_t> g_liveBytes{0};
 inline std::atomic<int64_t> g_peakBytes{0};
+/// Calls of operator new so far (a benchmark compares two readings).
+inline std::atomic<uint64_t> g_allocationCount{0};
 
 /// Peak bytes allocated above the level at construction, while it lives.
 class PeakAllocation {
@@ -26,6 +28,7 @@ private:
 void* operator new(size_t i_size) {
   void* p = std::malloc(i_size ? i_size : 1);
   if (!p) throw std::bad_alloc();
+  Bench::g_allocationCount.fetch_add(1, std::memory_order_relaxed);
   const int64_t now = Bench::g_liveBytes += int64_t(malloc_usable_size(p));
   int64_t peak = Bench::g_peakBytes.load();
   while (now > peak && !Bench::g_peakBytes.compare_exchange_weak(peak, now)) {

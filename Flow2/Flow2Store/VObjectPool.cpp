@@ -19,10 +19,15 @@ struct VThreadObjects {
   }
 };
 
+/// Set once the thread's caches are destroyed (a trivial thread_local outlives them), so that a
+/// pool destroyed later on that thread, by a static destructor at exit, doesn't touch them.
+thread_local bool t_CachesGone = false;
+
 /// Every pool's vector of one thread; the last one used is looked at first.
 struct VThreadCaches {
   std::vector<std::unique_ptr<VThreadObjects>> m_Pools;
   VThreadObjects* m_pLast = nullptr;
+  ~VThreadCaches() { t_CachesGone = true; }
 };
 
 VThreadCaches& Caches() {
@@ -53,6 +58,7 @@ std::vector<void*>& ThreadObjects(std::uint64_t poolId, VDeleteObject deleteObje
 }
 
 void DropThreadObjects(std::uint64_t poolId) {
+  if (t_CachesGone) return; // the thread's objects were deleted with its caches
   VThreadCaches& caches = Caches();
   auto it = std::find_if(caches.m_Pools.begin(), caches.m_Pools.end(),
                          [&](const auto& pPool) { return pPool->m_PoolId == poolId; });

@@ -4,26 +4,14 @@
 #include "Flow2/Flow2Types/IFlowHandles.h"
 #include "Flow2/Flow2Types/IFlowItem.h"
 #include "Utils/UtilsFileSystem/IResult.h"
+#include "Utils/UtilsFileSystem/Streams.h"
 
 #include <cstdint>
 #include <memory>
 
 namespace ZMT {
 
-class IBufferConst {
-public:
-  virtual ~IBufferConst() = default;
-  virtual const std::uint8_t* GetData() const = 0;
-  virtual std::uint64_t GetSize() const = 0;
-  /// Hooks around a use of the bytes by another component; nothing needs them yet.
-  virtual void OnAttach() const {}
-  virtual void OnDetach() const {}
-};
-
-class IBuffer : public IBufferConst {
-public:
-  virtual std::uint8_t* GetMutableData() = 0;
-};
+// IBufferConst and IBuffer live with the byte streams (Utils/UtilsFileSystem/Streams.h).
 
 /// One page of a chain. The chain's value is the pages' bytes in order.
 class IFlowBufferConst : public IBufferConst {

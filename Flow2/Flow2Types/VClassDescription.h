@@ -7,6 +7,7 @@
 #include <functional>
 #include <string>
 #include <type_traits>
+#include <utility>
 #include <vector>
 
 namespace ZMT {
@@ -24,6 +25,8 @@ struct VClassDescription {
   std::string m_ClassName;
   std::string m_ClassText;
   std::vector<VMember> m_Members;
+  /// Member renames, oldest first: (from, to).
+  std::vector<std::pair<std::string, std::string>> m_Renames;
 
   /// Sets the node to a NamedTuple of the members, with documentation if asked.
   void BuildSchema(ISchema& o_rSchema, bool withDocs) const {
@@ -31,6 +34,7 @@ struct VClassDescription {
     o_rSchema.m_HasName = 1;
     o_rSchema.m_Name = m_ClassName;
     if (withDocs) o_rSchema.m_Docs.push_back(m_ClassText);
+    o_rSchema.m_Renames = m_Renames;
     o_rSchema.m_Members.resize(m_Members.size());
     for (std::size_t i = 0; i < m_Members.size(); ++i) {
       o_rSchema.m_Members[i].m_Name = m_Members[i].m_Name;
@@ -50,6 +54,11 @@ private:
     VClassDescription description;
     description.m_ClassName = T::FlowClassName;
     if constexpr (requires { T::FlowClassDoc; }) description.m_ClassText = T::FlowClassDoc;
+    // A class whose members were renamed lists the renames, oldest first, as
+    //   static constexpr std::pair<const char*, const char*> FlowRenames[] = {{"Old", "New"}};
+    if constexpr (requires { T::FlowRenames; })
+      for (const auto& [from, to] : T::FlowRenames)
+        description.m_Renames.emplace_back(from, to);
     const T probe{};
     T::FlowFields(probe, [&](const char* name, const char* text, const auto& field) {
       using F = std::decay_t<decltype(field)>;

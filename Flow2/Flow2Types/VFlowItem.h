@@ -8,6 +8,7 @@
 //   static constexpr const char* FlowDescription;      optional
 //   bool FlowTag(TagId, std::string&) const;           optional, see FlowTags.h
 
+#include "Flow2/Flow2Types/FlowCompile.h"
 #include "Flow2/Flow2Types/FlowFieldTraits.h"
 #include "Flow2/Flow2Types/IFlowItem.h"
 #include "Flow2/Flow2Types/IFlowItemFactory.h"
@@ -79,12 +80,17 @@ public:
   /// Raises std::bad_function_call if the creation function is empty.
   IFlowItem* Create() const override { return m_Create(); }
   IFlowItemReadFunction GetReader(const ISchema* i_pFileSchema) const override {
-    // Data written with another schema needs a compiled reader; until those exist only an equal
-    // schema can be read.
-    if (i_pFileSchema && !(*i_pFileSchema == FlowTypeStatics<T>().m_Schema)) return {};
-    return [](IInputStream& io_rStream, IFlowItem& io_rItem) {
+    if (!i_pFileSchema || *i_pFileSchema == FlowTypeStatics<T>().m_Schema)
+      return [](IInputStream& io_rStream, IFlowItem& io_rItem) {
+        auto* pItem = dynamic_cast<VFlowItem<T>*>(&io_rItem);
+        return pItem && pItem->Read(io_rStream);
+      };
+    // Data written with another version of the type: a reader compiled for that schema.
+    IReaderPtr pReader = CompileReader<T>(*i_pFileSchema, FlowTypeStatics<T>().m_Schema);
+    if (!pReader) return {};
+    return [pReader](IInputStream& io_rStream, IFlowItem& io_rItem) {
       auto* pItem = dynamic_cast<VFlowItem<T>*>(&io_rItem);
-      return pItem && pItem->Read(io_rStream);
+      return pItem && pReader->Read(io_rStream, static_cast<T*>(pItem)).IsSuccess();
     };
   }
 

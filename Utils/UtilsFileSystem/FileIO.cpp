@@ -87,6 +87,11 @@ boost::filesystem::path PlatformPath(const boost::filesystem::path& path) {
   return path;
 }
 
+ZMT::IResult OpenFailureOf(const boost::filesystem::path& path, int error,
+                           const char* lockedFormat) {
+  return OpenFailure(path, error, lockedFormat);
+}
+
 VFileResult OpenOutputFile(const boost::filesystem::path& path, bool binary) {
   return OpenFile(path, binary ? "wb" : "w",
                   "Failed to open output file %1% locked by processes '%2%'.");

@@ -42,6 +42,11 @@ VOutputStreamResult OpenOutputFileStream(const boost::filesystem::path& path, bo
 /// A standard input file stream. Null on failure.
 VInputStreamResult OpenInputFileStream(const boost::filesystem::path& path, bool binary);
 
+/// The result of an open that failed with `error`; a refused one logs the holders of the file
+/// with `lockedFormat` (%1% the path, %2% the holders).
+ZMT::IResult OpenFailureOf(const boost::filesystem::path& path, int error,
+                           const char* lockedFormat);
+
 /// fclose; a failure is mapped from errno. A null file is InvalidArgument.
 ZMT::IResult CloseFile(std::FILE* pFile);
 /// Moves to `offset` from `origin` (SEEK_SET, SEEK_CUR, SEEK_END).

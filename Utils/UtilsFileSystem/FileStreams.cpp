@@ -48,6 +48,20 @@ ZMT::IResult VFileInputStream::Close() {
   return CloseFile(std::exchange(m_pFile, nullptr));
 }
 
+bool IOutputStreamSeekableOwningAdapter<VFileOutputStream>::Write(const ZMT::VGatherList& pieces) {
+  std::FILE* pFile = m_Stream.File();
+  if (!pFile) return false;
+  bool ok = true;
+  ::flockfile(pFile);
+  for (const auto& [pData, size] : pieces)
+    if (size && ::fwrite_unlocked(pData, static_cast<std::size_t>(size), 1, pFile) != 1) {
+      ok = false;
+      break;
+    }
+  ::funlockfile(pFile);
+  return ok;
+}
+
 bool VFileSeekable::GetSize(std::uint64_t& o_rSize) {
   const auto [size, result] = GetFileSize(SeekableFile());
   if (result.IsFailure()) {

@@ -78,6 +78,8 @@ public:
     return m_Stream.Write(pBuffer, size);
   }
   using ZMT::IOutputStream::Write;
+  /// All pieces under one lock of the file.
+  bool Write(const ZMT::VGatherList& pieces) override;
   VFileOutputStream& Stream() { return m_Stream; }
 
 protected:

@@ -2,10 +2,27 @@
 // Byte stream interfaces shared by file output, Flow files and memory-mapped input.
 
 #include <cstdint>
+#include <memory>
 #include <utility>
 #include <vector>
 
 namespace ZMT {
+
+/// Bytes held by someone else; streams can hand such a buffer on instead of copying it.
+class IBufferConst {
+public:
+  virtual ~IBufferConst() = default;
+  virtual const std::uint8_t* GetData() const = 0;
+  virtual std::uint64_t GetSize() const = 0;
+  /// Hooks around a use of the bytes by another component; nothing needs them yet.
+  virtual void OnAttach() const {}
+  virtual void OnDetach() const {}
+};
+
+class IBuffer : public IBufferConst {
+public:
+  virtual std::uint8_t* GetMutableData() = 0;
+};
 
 /// A list of (pointer, size) pieces written or read in order.
 using VGatherList = std::vector<std::pair<const void*, std::uint64_t>>;
@@ -21,6 +38,11 @@ public:
     for (const auto& [pData, size] : pieces)
       if (!Write(pData, size)) return false;
     return true;
+  }
+  /// Writes a buffer's bytes; a stream that can keep the buffer by reference does so.
+  virtual bool Write(const std::shared_ptr<const IBufferConst>& i_pBuffer) {
+    return !i_pBuffer || i_pBuffer->GetSize() == 0 ||
+           Write(i_pBuffer->GetData(), i_pBuffer->GetSize());
   }
 };
 
@@ -47,6 +69,11 @@ public:
     for (const auto& [pData, size] : pieces)
       if (!Read(pData, size)) return false;
     return true;
+  }
+  /// The next `size` bytes as a buffer shared with the stream, without copying; false (reading
+  /// nothing) where the stream can't do that, and the caller copies.
+  virtual bool ReadShared(std::uint64_t size, std::shared_ptr<const IBufferConst>& o_rBuffer) {
+    return false;
   }
 };
 

@@ -130,12 +130,17 @@ TEST(FlowItemFactory, CreatesDefaultsAndGivesReaders) {
   ASSERT_TRUE(native(in, *pItem));
   EXPECT_EQ(Serialise(*pItem), bytes);
 
-  // A reader for the same schema exists; for another schema there is none yet.
+  // Readers exist for the same schema and for one with a member fewer; a member whose type
+  // can't be read into the local one leaves no reader.
   ZMT::ISchema same = factory.GetInfo().m_Schema;
   same.m_Docs.clear();
   EXPECT_TRUE(factory.GetReader(&same));
+  ZMT::ISchema fewer = same;
+  fewer.m_Members.pop_back();
+  EXPECT_TRUE(factory.GetReader(&fewer));
   ZMT::ISchema other = same;
-  other.m_Members.pop_back();
+  other.m_Members[0].m_Schema = ZMT::ISchema();
+  other.m_Members[0].m_Schema.m_Type = ZMT::ISchema::String;
   EXPECT_FALSE(factory.GetReader(&other));
 
   // The native reader refuses an item of another type.
