@@ -3,6 +3,7 @@
 // state, so the schema is that of the plain value.
 
 #include "Flow2/Flow2Types/FlowFieldTraits.h"
+#include "Flow2/Flow2Types/FlowReaderInfo.h"
 #include "River/CoreOstraTypes/IOptional.h"
 
 namespace ZMT {
@@ -14,6 +15,12 @@ template <class T> struct TFlowField<IOptional<T>> {
   }
   static bool Read(IInputStream& s, IOptional<T>& v) { return TFlowField<T>::Read(s, v.Raw()); }
   static std::uint64_t Size(const IOptional<T>& v) { return TFlowField<T>::Size(v.Raw()); }
+};
+
+/// An optional holds nothing but its value, so it is read as the value at the same place.
+template <class T> struct TFlowReaderInfo<IOptional<T>> {
+  static_assert(sizeof(IOptional<T>) == sizeof(T), "an optional is its value and nothing else");
+  static IReaderInfoPtr Get() { return TFlowReaderInfo<T>::Get(); }
 };
 
 } // namespace ZMT

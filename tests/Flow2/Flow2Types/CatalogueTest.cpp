@@ -3,6 +3,7 @@
 #include "FlowTestTypes.h"
 
 #include "Flow2/Flow2Types/FlowCatalogue.h"
+#include "Flow2/Flow2Types/FlowCompile.h"
 
 #include <gtest/gtest.h>
 
@@ -266,6 +267,16 @@ template <class T> void CheckRoundTrip(const char* i_name) {
   EXPECT_EQ(in.m_Offset, bytes.size());
   EXPECT_TRUE(static_cast<const T&>(*static_cast<ZMT::Detail::VFlowItem<T>*>(back.get())) ==
               static_cast<const T&>(item));
+  // The reader compiled from the type's own schema (the road of files written by another build)
+  // reads the same bytes to the same value.
+  const ZMT::ISchema& schema = ZMT::Detail::FlowTypeStatics<T>().m_Schema;
+  const ZMT::IReaderPtr pCompiled = ZMT::CompileReader<T>(schema, schema);
+  ASSERT_TRUE(pCompiled);
+  ZMT::Detail::VFlowItem<T> compiled;
+  VBytesIn compiledIn(bytes);
+  ASSERT_TRUE(pCompiled->Read(compiledIn, static_cast<T*>(&compiled)).IsSuccess());
+  EXPECT_EQ(compiledIn.m_Offset, bytes.size());
+  EXPECT_TRUE(static_cast<const T&>(compiled) == static_cast<const T&>(item));
   // A default item differs: the filler reached the fields.
   EXPECT_FALSE(T{} == static_cast<const T&>(item));
 
