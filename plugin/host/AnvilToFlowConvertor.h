@@ -3,9 +3,10 @@
 // frame (trajectories, subject poses, camera observations, scene orientation).
 //
 // What each list holds, in the order the host fills it:
-//   cameras   a: "FlowCameraHardware", b: "FlowCameraCalibration" (calibrated cameras only),
-//             c: "FlowCameraCalibrationDetails" (cameras with calibration details),
-//             d: "FlowCameraMaskGrid"; names: every camera converted, in list a's order.
+//   cameras   four lists parallel to the names, one entry per camera converted, in the
+//             database's order: a "FlowCameraHardware", b "FlowCameraCalibration" (focal
+//             length 0 for a camera that is not calibrated), c "FlowCameraCalibrationDetails",
+//             d "FlowCameraMaskGrid". Without calibrations, lists b and c stay empty.
 //   subjects  for the labeling, solving and retargeting setups in that order, four lists each:
 //             the parametrised subject, the subject evaluated at its own parameters, the
 //             application data, the dynamic subspace ("FlowSubjectParametrised",
@@ -28,9 +29,9 @@ public:
   AnvilToFlowConvertor(const AnvilToFlowConvertor&) = delete;
   AnvilToFlowConvertor& operator=(const AnvilToFlowConvertor&) = delete;
 
-  /// The static items of the scene's cameras into the four lists (see above). `i_optical`:
-  /// optical cameras; `i_video`: video cameras (hardware items only, they have no calibration
-  /// the lists can hold); `i_calibrations`: lists b and c. False when an item can't be made.
+  /// The static items of the scene's optical cameras into the four lists (see above).
+  /// `i_optical`: convert them at all; `i_video`: also those flagged as video (DV) cameras;
+  /// `i_calibrations`: fill lists b and c. False when an item can't be made.
   bool convertCameras(ZMT::IFlowStoreHandle& io_rStore, std::vector<std::string>& o_rNames,
                       Items& o_rHardware, Items& o_rCalibrations, Items& o_rDetails,
                       Items& o_rMasks, bool i_optical, bool i_video, bool i_calibrations);
