@@ -5,6 +5,7 @@
 #include "commands/KmrExportOptionsCmd.h"
 #include "commands/KmsExportOptionsCmd.h"
 #include "commands/KmtExportOptionsCmd.h"
+#include "commands/McpExportOptionsCmd.h"
 #include "commands/TrcExportOptionsCmd.h"
 #include "commands/UsdExportOptionsCmd.h"
 #include <new>
@@ -14,10 +15,10 @@ AnvilFileExporterCommandsPlugin* AnvilFileExporterCommandsPlugin::createInstance
 }
 
 bool AnvilFileExporterCommandsPlugin::loadCommands() {
-  // Option commands join here, in the host's order, as their exporters gain them.
+  // The host's order.
   m_commands.add(new (std::nothrow) C3dExportOptionsCmd());
   m_commands.add(new (std::nothrow) FbxExportOptionsCmd());
-
+  m_commands.add(new (std::nothrow) McpExportOptionsCmd());
   m_commands.add(new (std::nothrow) TrcExportOptionsCmd());
   m_commands.add(new (std::nothrow) KmtExportOptionsCmd());
   m_commands.add(new (std::nothrow) KmfExportOptionsCmd());

@@ -1,5 +1,6 @@
 #include "AnvilFileExportersPlugin.h"
 #include "exporters/camera/XCPExporter.h"
+#include "exporters/mcp/AnvilMCPExporter.h"
 #include "exporters/scene/AnvilFbxExporter.h"
 #include "exporters/scene/USDExporter.h"
 #include "exporters/subject/KmfExporter.h"
@@ -26,5 +27,6 @@ bool AnvilFileExportersPlugin::loadExporters() {
   m_exporters.add(KmrExporter::createInstance());
   m_exporters.add(XCPExporter::createInstance());
   m_exporters.add(USDExporter::createInstance());
+  m_exporters.add(AnvilMCPExporter::createInstance());
   return true;
 }

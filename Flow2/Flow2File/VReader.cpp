@@ -146,6 +146,12 @@ IResult VReader::Open(ZMT::IInputStreamSeekable* i_pStream) {
       }
     }
     Scan(scanFrom);
+  } else if (m_Size == AfterTables && ReadHeader(FirstTable, header) &&
+             header.m_Type == std::uint16_t(EChunkType::TypeTable) &&
+             ReadHeader(SecondTable, header) &&
+             header.m_Type == std::uint16_t(EChunkType::ItemTable)) {
+    // The header and the two opening tables, nothing after: a closed recording of nothing.
+    m_Complete = true;
   } else {
     // Not closed, or its tables are damaged: every chunk is walked.
     Problem("the file's tables are missing or damaged: its chunks were walked one by one");

@@ -13,9 +13,9 @@
 //             "FlowSubject", "FlowSubjectApplicationData", "FlowSubjectDynamicSubspace", then
 //             the "ForSolving" and "ForRetargeting" types). One item per subject that has the
 //             setup, in subject order; subject ids are 1-based subject indices.
-#include "HostExport.h"
 #include "Flow2/Flow2Types/IFlowHandles.h"
 #include "Flow2/Flow2Types/IFlowState.h"
+#include "HostExport.h"
 #include <cstdint>
 #include <string>
 #include <vector>
@@ -45,8 +45,7 @@ public:
                               Items& o_rParametrisedForSolving, Items& o_rSubjectsForSolving,
                               Items& o_rApplicationForSolving, Items& o_rSubspacesForSolving,
                               Items& o_rParametrisedForRetargeting,
-                              Items& o_rSubjectsForRetargeting,
-                              Items& o_rApplicationForRetargeting,
+                              Items& o_rSubjectsForRetargeting, Items& o_rApplicationForRetargeting,
                               Items& o_rSubspacesForRetargeting);
   /// Adds every handle of the list to the state at the state's time.
   static void addItmesToFlowState(Items& i_rItems, ZMT::IFlowState& io_rState);
@@ -60,10 +59,10 @@ public:
   ///    (a "FlowParametersItem" whose tags name each track), shared by every frame of a take;
   ///  - `i_forSolving`: the three trajectory sets again under their "ForSolving" types;
   ///  - `i_orientation`: a "FlowSceneOrientation" of the scene's up axis.
-  static void convertDynamicData(ZMT::IFlowStoreHandle& io_rStore,
-                                 ZMT::IFlowStateHandle& io_rState, std::int64_t i_tick,
-                                 bool i_cameras, bool i_subjectPoses, bool i_subjectLocalPoses,
-                                 bool i_trajectories, bool i_forSolving, bool i_orientation);
+  static void convertDynamicData(ZMT::IFlowStoreHandle& io_rStore, ZMT::IFlowStateHandle& io_rState,
+                                 std::int64_t i_tick, bool i_cameras, bool i_subjectPoses,
+                                 bool i_subjectLocalPoses, bool i_trajectories, bool i_forSolving,
+                                 bool i_orientation);
 
 private:
   struct Impl;

@@ -45,11 +45,12 @@ TEST(PluginEntry, ApiAndPluginObjects) {
 namespace {
 // The host lists exporters and commands in exactly this order; the lists grow as formats land
 // (mcp takes its place between these).
-const std::vector<std::string> kExporterOrder = {"c3d", "csm", "trc", "fbx", "kmf",
-                                                 "kmt", "kms", "kmr", "xcp", "usd"};
+const std::vector<std::string> kExporterOrder = {"c3d", "csm", "trc", "fbx", "kmf", "kmt",
+                                                 "kms", "kmr", "xcp", "usd", "mcp"};
 const std::vector<std::string> kCommandOrder = {
-    "c3dExportOptions", "fbxExportOptions", "trcExportOptions", "kmtExportOptions",
-    "kmfExportOptions", "kmsExportOptions", "kmrExportOptions", "usdExportOptions"};
+    "c3dExportOptions", "fbxExportOptions", "mcpExportOptions",
+    "trcExportOptions", "kmtExportOptions", "kmfExportOptions",
+    "kmsExportOptions", "kmrExportOptions", "usdExportOptions"};
 } // namespace
 
 TEST(PluginEntry, CommandsLoadInTheHostsOrder) {

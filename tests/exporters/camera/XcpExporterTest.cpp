@@ -42,8 +42,8 @@ OpticalCamera* addCamera(int i_number, const char* i_pName) {
   auto* pCamera = new OpticalCamera(i_pName);
   pCamera->setCameraNumber(i_number);
   pCamera->setDeviceURN(HString("cam:") + HString(std::to_string(2100 + i_number)));
-  pCamera->setCameraType("V16");
-  pCamera->setDisplayType("Vantage 16");
+  pCamera->setCameraType("O16");
+  pCamera->setDisplayType("Optical 16");
   pCamera->setSensorSize(4096, 4096);
   g_db->addToScene(pCamera, false, nullptr, false, false);
   return pCamera;
@@ -112,7 +112,7 @@ TEST_F(XcpExporterTest, WritesEveryElementAndAttributeInOrder) {
                 "<Cameras VERSION=\"1.0\" SOURCE=\"HarrowPost\" UP_AXIS=\"Z\" "
                 "FLOOR_EXTENTS=\"-4000 4000 -3000 3000\">\n"
                 "\t<Camera DEVICEID=\"2101\" DEVICEURN=\"cam:2101\" USERID=\"0\" "
-                "NAME=\"Cam &amp; 1\" TYPE=\"V16\" DISPLAY_TYPE=\"Vantage 16\" ISDV=\"2\" "
+                "NAME=\"Cam &amp; 1\" TYPE=\"O16\" DISPLAY_TYPE=\"Optical 16\" ISDV=\"2\" "
                 "SENSOR=\"\" SENSOR_SIZE=\"4096 4096\" PIXEL_ASPECT_RATIO=\"1\" "
                 "ACTIVE_THRESHOLD=\"1\" SYSTEM=\"ZR\">\n"
                 "\t\t<ThresholdGrid BIT_DEPTH=\"1\" DATA=\"AAB\" GRID_SIZE=\"256 512\" "
