@@ -21,13 +21,14 @@ struct LongTakeShape {
   const char* markerPrefix = "M"; ///< marker names are prefix + index
   const char* subject = nullptr;  ///< when set, the markers sit under a subject of that name
   bool gaps = false;              ///< drop a few frames of each marker now and then
+  bool keepScene = false;         ///< add the markers to the scene as it is instead of a new one
 };
 
 /// Builds the take into `g_db` on first call (later calls return the same markers).
 inline std::vector<Marker*>& longTake(const LongTakeShape& i_rShape = LongTakeShape()) {
   static std::vector<Marker*> s_markers;
   if (!s_markers.empty()) return s_markers;
-  g_db->clearScene();
+  if (!i_rShape.keepScene) g_db->clearScene();
   HTimeManager* pTime = g_db->getTimeManager();
   pTime->setFrameRate(120.0);
   const int64_t tpf = pTime->getTicksPerFrame();

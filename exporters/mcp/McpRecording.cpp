@@ -110,6 +110,11 @@ bool McpRecording::write(const std::string& i_rPath) {
   written &= !writer.WriteItems(all, false).IsFailure();
   written &= writer.Close().IsSuccess();
   if (!written) {
+    // A failed write leaves its reason on the file: committing reports it and keeps the old file.
+    if (file.WriteError() != 0)
+      file.Commit();
+    else
+      g_db->logError("Unable to write %s.", path.c_str());
     file.Abandon();
     return false;
   }

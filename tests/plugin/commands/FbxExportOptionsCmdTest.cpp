@@ -30,7 +30,7 @@ TEST_F(FbxExportOptionsCmdTest, DeclaresItsOptionsAndFollowsC3d) {
   ASSERT_GE(names.size(), 3u);
   EXPECT_EQ(names[0], "c3dExportOptions");
   EXPECT_EQ(names[1], "fbxExportOptions");
-  EXPECT_EQ(names[2], "trcExportOptions");
+  EXPECT_EQ(names[2], "mcpExportOptions");
 }
 
 TEST_F(FbxExportOptionsCmdTest, SetsEveryOptionKind) {
