@@ -19,10 +19,9 @@ namespace AnvilCore::FlowItems {
 
 /// A new item of a catalogued type in the store, or null when the store lacks the type.
 template <class T> T* create(ZMT::IFlowStoreHandle& io_rStore, ZMT::IFlowItemHandle& o_rItem) {
-  ZMT::IFlowItemTypeInfo info;
-  if (!io_rStore || io_rStore->GetTypeInfo(T::FlowTypeId, info).IsFailure() ||
-      io_rStore->CreateItem(info, o_rItem).IsFailure())
-    return nullptr;
+  // The type's own record: no copy of its name per item.
+  const ZMT::IFlowItemTypeInfo& info = ZMT::Detail::FlowTypeStatics<T>().m_TypeInfo;
+  if (!io_rStore || io_rStore->CreateItem(info, o_rItem).IsFailure()) return nullptr;
   return o_rItem.As<ZMT::Detail::VFlowItem<T>>();
 }
 

@@ -12,7 +12,7 @@ class RatioReporter : public benchmark::ConsoleReporter {
 public:
   void ReportRuns(const std::vector<Run>& i_runs) override {
     for (const Run& run : i_runs)
-      m_seconds[run.benchmark_name()] = run.GetAdjustedRealTime();
+      if (!run.error_occurred) m_seconds[run.benchmark_name()] = run.GetAdjustedRealTime();
     ConsoleReporter::ReportRuns(i_runs);
   }
   /// Prints "i_label: R" with R the time of `i_road` over that of `i_floor`, when both ran.

@@ -16,10 +16,11 @@ void addTimecode(ZMT::IFlowStoreHandle& io_rStore, ZMT::IFlowState& io_rState,
                  const HTimeManager& i_rTime, HTime i_clipTime) {
   const ZMT::ITimecode<135000000> timecode = i_rTime.getTimecode(i_clipTime);
   if (!timecode.isValid()) return;
-  ZMT::IFlowItemTypeInfo info;
   ZMT::IFlowItemHandle item;
-  if (io_rStore->GetTypeInfo(ZMT::Catalogue::VFlowTimecode::FlowTypeId, info).IsFailure() ||
-      io_rStore->CreateItem(info, item).IsFailure())
+  if (io_rStore
+          ->CreateItem(ZMT::Detail::FlowTypeStatics<ZMT::Catalogue::VFlowTimecode>().m_TypeInfo,
+                       item)
+          .IsFailure())
     return;
   auto* pTimecode = item.As<ZMT::Detail::VFlowItem<ZMT::Catalogue::VFlowTimecode>>();
   static_cast<ZMT::ITimecode<135000000>&>(*pTimecode) = timecode;
