@@ -266,8 +266,7 @@ void TakeConverter::addCentroids(ZMT::IFlowState& io_rState, std::int64_t) {
       centroid.m_Position = {u, v};
       centroid.m_Radius = camera.focal * kMarkerDiameter * 0.5 / -z;
       centroid.m_Score = 1.0;
-      centroid.m_PixelCount =
-          std::uint32_t(std::lround(M_PI * centroid.m_Radius * centroid.m_Radius));
+      centroid.m_PixelCount = std::uint32_t(M_PI * centroid.m_Radius * centroid.m_Radius + 0.5);
       pSet->m_Centroids.push_back(centroid);
     }
     io_rState.AddItem(item, io_rState.GetTime());
