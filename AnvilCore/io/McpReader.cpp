@@ -3,6 +3,7 @@
 #include "Flow2/Flow2Store/VFlowStoreFactory.h"
 #include "Flow2/Flow2Types/FlowCatalogue.h"
 #include "Flow2/Flow2Types/IFlowResult.h"
+#include "exporters/trajectory/c3d/PrintableText.h"
 #include "plugin/host/ParameterizedSetup.h"
 #include <algorithm>
 #include <array>
@@ -118,7 +119,8 @@ void readSubjects(const std::vector<IFlowItemHandle>& i_rItems, McpContent& io_r
 
   std::set<std::string> names;
   for (const auto& [id, pSubject] : subjects) {
-    const std::string& name = pSubject->m_Name;
+    // Made printable the same way as the track names, so that "Subject:Marker" still meets it.
+    const std::string name = C3D::printableText(pSubject->m_Name);
     if (name.empty()) {
       io_rContent.warnings.push_back("subject id " + std::to_string(id) + " has no name; left out");
       continue;
@@ -129,6 +131,7 @@ void readSubjects(const std::vector<IFlowItemHandle>& i_rItems, McpContent& io_r
     }
     SubjectRecords records;
     records.subject = *pSubject;
+    records.subject.m_Name = name;
     if (auto it = applications.find(id); it != applications.end())
       records.application = *it->second;
     else
@@ -253,14 +256,15 @@ public:
   void finish() {
     for (const auto& [id, label] : m_labels)
       m_tracks.try_emplace(id);
-    std::size_t unnamed = 0;
+    std::size_t unnamed = 0, unprintable = 0;
     m_content.tracks.reserve(m_tracks.size());
     for (auto& [id, gathered] : m_tracks) {
       McpTrack track;
       track.trackId = id;
       const auto label = m_labels.find(id);
       if (label != m_labels.end() && !label->second.empty()) {
-        track.label = label->second;
+        track.label = C3D::printableText(label->second);
+        if (track.label != label->second) ++unprintable;
       } else {
         track.label = "Track" + std::to_string(id);
         ++unnamed;
@@ -278,6 +282,10 @@ public:
       m_content.warnings.push_back(std::to_string(unnamed) +
                                    " tracks have no name in the trajectory table: named "
                                    "Track<id>");
+    if (unprintable > 0)
+      m_content.warnings.push_back(std::to_string(unprintable) +
+                                   " track names had characters that can't be printed, replaced "
+                                   "by \"?\"");
     m_warnings.flush(m_content.warnings);
   }
 
@@ -424,7 +432,8 @@ bool readMcp(ZMT::IInputStreamSeekable& io_rStream, McpContent& o_rContent, std:
   }
   if (!index.empty() && o_rContent.frameCount == 0 && sceneItems.empty()) {
     o_rError = "damaged: none of its " + std::to_string(index.size()) + " frames can be read";
-    if (!reader.GetProblems().empty()) o_rError += " (" + reader.GetProblems().front() + ")";
+    if (!reader.GetProblems().empty())
+      o_rError += " (" + C3D::printableText(reader.GetProblems().front()) + ")";
     return false;
   }
   if (o_rContent.frameCount > 0) o_rContent.ticksPerFrame = std::int64_t(period);
@@ -443,6 +452,8 @@ bool readMcp(ZMT::IInputStreamSeekable& io_rStream, McpContent& o_rContent, std:
                        " more problems");
   if (index.empty() && sceneItems.empty())
     warnings.push_back("the file holds no frames, cameras or subjects");
+  for (std::string& warning : warnings)
+    warning = C3D::printableText(warning);
   return true;
 }
 

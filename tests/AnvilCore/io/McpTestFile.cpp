@@ -3,21 +3,27 @@
 #include "Flow2/Flow2Store/VFlowStoreFactory.h"
 #include "Flow2/Flow2Types/FlowCatalogue.h"
 #include "Utils/UtilsFileSystem/MemoryStreams.h"
-#include <gtest/gtest.h>
+#include <stdexcept>
 
 namespace {
 namespace Cat = ZMT::Catalogue;
 
+// The writer refusing a file of the test's own making is a fault of the test: stop loudly.
+void check(bool i_ok, const char* i_pWhat) {
+  if (!i_ok) throw std::runtime_error(std::string("McpTestFile: ") + i_pWhat);
+}
+
 struct Writing {
   Writing() {
     auto& factory = Flow2Store::GetFlowStoreFactory();
-    EXPECT_TRUE(factory.CreateStore(store, ZMT::GetFlowCatalogueFactories(), 1).IsSuccess());
-    EXPECT_TRUE(factory.CreateBufferFactory(buffers, nullptr).IsSuccess());
-    EXPECT_TRUE(factory.CreateStateFactory(states).IsSuccess());
+    check(factory.CreateStore(store, ZMT::GetFlowCatalogueFactories(), 1).IsSuccess(), "store");
+    check(factory.CreateBufferFactory(buffers, nullptr).IsSuccess(), "buffers");
+    check(factory.CreateStateFactory(states).IsSuccess(), "states");
   }
   template <class W> W* make(std::vector<ZMT::IFlowItemHandle>& io_rList) {
     ZMT::IFlowItemHandle item;
-    EXPECT_TRUE(store->CreateItem(ZMT::Detail::FlowTypeStatics<W>().m_TypeInfo, item).IsSuccess());
+    check(store->CreateItem(ZMT::Detail::FlowTypeStatics<W>().m_TypeInfo, item).IsSuccess(),
+          "item");
     io_rList.push_back(item);
     return item.As<ZMT::Detail::VFlowItem<W>>();
   }
@@ -89,14 +95,14 @@ std::vector<std::uint8_t> McpTestFile::build() const {
 
   UtilsFileSystem::VMemoryOutputStream out;
   Flow2File::VWriter writer(w.buffers, w.store);
-  EXPECT_TRUE(writer.Open(&out).IsSuccess());
+  check(writer.Open(&out).IsSuccess(), "open");
   for (size_t f = 0; f < frames.size(); ++f) {
     const std::int64_t time = (firstFrame + std::int64_t(f)) * ticksPerFrame;
     ZMT::IFlowStateHandle state;
-    EXPECT_TRUE(
-        w.states
-            ->CreateState(state, {time - ticksPerFrame, std::uint64_t(ticksPerFrame), 1}, {}, {})
-            .IsSuccess());
+    check(w.states
+              ->CreateState(state, {time - ticksPerFrame, std::uint64_t(ticksPerFrame), 1}, {}, {})
+              .IsSuccess(),
+          "new state");
     std::vector<ZMT::IFlowItemHandle> items = scene;
     items.insert(items.end(), shared.begin(), shared.end());
     auto* pSet = w.make<Cat::VFlowReconstructionSet>(items);
@@ -111,9 +117,9 @@ std::vector<std::uint8_t> McpTestFile::build() const {
     }
     for (const ZMT::IFlowItemHandle& item : items)
       state->AddItem(item);
-    EXPECT_TRUE(writer.WriteState(*state).IsSuccess());
+    check(writer.WriteState(*state).IsSuccess(), "state");
   }
-  if (withStaticItems) EXPECT_TRUE(writer.WriteItems(scene, false).IsSuccess());
-  EXPECT_TRUE(writer.Close().IsSuccess());
+  if (withStaticItems) check(writer.WriteItems(scene, false).IsSuccess(), "static items");
+  check(writer.Close().IsSuccess(), "close");
   return out.Bytes();
 }
