@@ -225,7 +225,6 @@ public:
     const bool labelled = pLabels && pLabels->m_ReconstructionLabels.size() == points.size();
     if (pLabels && !labelled)
       m_warnings.add("labels", "a label set doesn't match its points; labels ignored");
-    m_frameTracks.clear();
     for (std::size_t i = 0; i < points.size(); ++i) {
       const std::uint32_t id =
           tracked ? pTracks->m_ReconstructionTracks[i].m_TrackId : std::uint32_t(i);
@@ -237,12 +236,12 @@ public:
         m_warnings.add("nan", "a point whose position is not a number was left out");
         continue;
       }
-      if (!m_frameTracks.insert(id).second) {
+      Track& track = m_tracks[id];
+      if (!track.times.empty() && track.times.back() == i_time) {
         m_warnings.add("twice", "a track with two points in one frame kept the first (track " +
                                     std::to_string(id) + ", tick " + tickText(i_time) + ")");
         continue;
       }
-      Track& track = m_tracks[id];
       const auto& p = points[i].m_Position;
       track.times.push_back(i_time);
       track.positions.emplace_back(p[0], p[1], p[2]);
@@ -314,7 +313,6 @@ private:
   McpContent& m_content;
   std::map<std::uint32_t, Track> m_tracks;
   std::map<std::uint32_t, std::string> m_labels;
-  std::set<std::uint32_t> m_frameTracks;
   ZMT::IFlowItemToken m_lastTable;
   bool m_sawTable = false;
   CountedWarnings m_warnings;

@@ -208,6 +208,30 @@ TEST_F(McpReaderTest, MissingTablesAndSetsAreRepairedWithWarnings) {
   EXPECT_TRUE(marker("*Second")->isUnlabeled());
 }
 
+TEST_F(McpReaderTest, PointsThatCannotBeKeyedAreLeftOutOnceCounted) {
+  McpTestFile file;
+  file.table = {{0, "A"}, {1, "B\tC"}};
+  for (int f = 0; f < 3; ++f)
+    file.frames.push_back({{0, {1.0 + f, 0, 0}},
+                           {0, {99, 99, 99}},
+                           {0xFFFFFFFFu, {5, 5, 5}},
+                           {1, {std::nan(""), 0, 0}}});
+  std::string error;
+  ASSERT_TRUE(read(writeFile("points.mcp", file.build()), error)) << error;
+  ASSERT_NE(marker("A"), nullptr);
+  ASSERT_EQ(marker("A")->m_track.getNumKeys(), 3);
+  EXPECT_DOUBLE_EQ(marker("A")->getWSPos(g_db->getTimeManager()->frameToTime(2)).x, 3.0);
+  // The name's tab can't be printed; the track is a marker without keys.
+  ASSERT_NE(marker("B?C"), nullptr);
+  EXPECT_EQ(marker("B?C")->m_track.getNumKeys(), 0);
+  EXPECT_TRUE(warned("points.mcp: a track with two points in one frame kept the first (track 0, "
+                     "tick 0) (3 times)"))
+      << allWarnings();
+  EXPECT_TRUE(warned("points.mcp: a point without a track was left out (3 times)"));
+  EXPECT_TRUE(warned("points.mcp: a point whose position is not a number was left out (3 times)"));
+  EXPECT_TRUE(warned("points.mcp: 1 track names had characters that can't be printed"));
+}
+
 TEST_F(McpReaderTest, SceneItemsAreFoundInTheFramesWithoutAnItemTable) {
   McpTestFile file = takeWithBob();
   file.cameras = {mcpTestCamera(1)};
