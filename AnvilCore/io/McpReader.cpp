@@ -25,6 +25,7 @@ constexpr std::uint64_t kReadingStoreId = 0x4d4350526561640bull;
 constexpr std::uint32_t kNoTrack = 0xFFFFFFFFu;
 // Ticks beyond which a frame time is refused: the clock's range with a wide margin.
 constexpr std::int64_t kTickLimit = std::int64_t(1) << 60;
+constexpr std::int64_t kFrameLimit = 0x7FFFFFFE;
 // Damage reports kept word for word; the rest are counted.
 constexpr std::size_t kProblemsShown = 20;
 
@@ -382,12 +383,11 @@ bool readMcp(ZMT::IInputStreamSeekable& io_rStream, McpContent& o_rContent, std:
   std::uint64_t period = 0;
   for (std::size_t i = 0; i < index.size(); ++i) {
     const Flow2File::VReader::VStateEntry& entry = index[i];
+    if (entry.m_Period == 0 || entry.m_Period > std::uint64_t(kTickLimit)) {
+      frameWarnings.add("rate", "frames without a usable rate were left out");
+      continue;
+    }
     if (!sawFirst) {
-      if (entry.m_Period == 0 || entry.m_Period > std::uint64_t(kTickLimit)) {
-        o_rError = "the frames have no usable rate (" + std::to_string(entry.m_Period) +
-                   " ticks per frame)";
-        return false;
-      }
       sawFirst = true;
       session = entry.m_Session;
       period = entry.m_Period;
@@ -401,6 +401,11 @@ bool readMcp(ZMT::IInputStreamSeekable& io_rStream, McpContent& o_rContent, std:
       continue;
     }
     const HTime time = entry.m_Tick + std::int64_t(period);
+    // Frame numbers are ints in the host's clock.
+    if (time / std::int64_t(period) > kFrameLimit || time / std::int64_t(period) < -kFrameLimit) {
+      frameWarnings.add("range", "frames outside the clock's range were left out");
+      continue;
+    }
     if (o_rContent.frameCount > 0 && time <= o_rContent.lastTime) {
       frameWarnings.add("order", "frames out of time order were left out");
       continue;
