@@ -159,6 +159,11 @@ void TrajectorySceneBuilder::addTopLevel(Module* i_pModule) {
 }
 
 void TrajectorySceneBuilder::commit(int64_t i_firstFrame, int64_t i_lastFrame) {
+  commit(HTimeRange(frameTime(i_firstFrame),
+                    frameTime(i_lastFrame < i_firstFrame ? i_firstFrame : i_lastFrame)));
+}
+
+void TrajectorySceneBuilder::commit(const HTimeRange& i_rRange) {
   Module* pRoot = g_db->getRoot();
   while (m_pStage->getNumChildren() > 0) {
     Module* pModule = m_pStage->detachChild(m_pStage->getChild(0));
@@ -177,11 +182,9 @@ void TrajectorySceneBuilder::commit(int64_t i_firstFrame, int64_t i_lastFrame) {
   m_markers.clear();
   HTimeManager* pTime = g_db->getTimeManager();
   pTime->setFrameRate(m_clock.getFrameRate());
-  const HTimeRange range(frameTime(i_firstFrame),
-                         frameTime(i_lastFrame < i_firstFrame ? i_firstFrame : i_lastFrame));
-  pTime->setAnimRange(range);
-  pTime->setPlayRange(range);
-  pTime->setCurrentTime(range.getStart());
+  pTime->setAnimRange(i_rRange);
+  pTime->setPlayRange(i_rRange);
+  pTime->setCurrentTime(i_rRange.getStart());
 }
 
 } // namespace AnvilCore

@@ -73,6 +73,8 @@ public:
   /// Moves everything into the scene, sets the clock to the file's rate and the animation and
   /// play ranges to frames [first, last] (one frame when last < first).
   void commit(int64_t i_firstFrame, int64_t i_lastFrame);
+  /// The same with the animation and play ranges given as times.
+  void commit(const HTimeRange& i_rRange);
 
 private:
   HTimeManager m_clock;

@@ -1,4 +1,6 @@
 // The built program end to end: exit codes, messages, and files written or not.
+#include "AnvilCore/demo/DemoWalk.h"
+#include "McpTestFile.h"
 #include <array>
 #include <cstdio>
 #include <filesystem>
@@ -145,4 +147,45 @@ TEST_F(AnvilCli, SubjectFilesAndTheirSchema) {
   run = anvil("info " + path("broken.kmt"));
   EXPECT_EQ(run.code, 1) << run.output;
   EXPECT_FALSE(run.output.empty());
+}
+
+TEST_F(AnvilCli, McpRecordingsAreDescribedConvertedOrRefused) {
+  const std::vector<std::string>& names = AnvilCore::demoWalkMarkerNames();
+  McpTestFile file;
+  file.ticksPerFrame = 135000000 / 60;
+  file.firstFrame = 5;
+  file.table = {{0, "Ann:" + names[0]}, {1, "Ann:" + names[1]}, {2, "*9"}};
+  for (int f = 0; f < 4; ++f)
+    file.frames.push_back({{0, {1.0 * f, 0, 0}}, {1, {0, 2.0 * f, 0}}, {2, {0, 0, 3.0}, 0.0f}});
+  AnvilCore::SubjectRecords ann = AnvilCore::demoWalkRecords();
+  ann.subject.m_Name = "Ann";
+  file.subjects.push_back(ann);
+  file.cameras = {mcpTestCamera(1), mcpTestCamera(2)};
+  file.orientation = std::array<double, 4>{0.70710678118654752, 0, 0, 0.70710678118654752};
+  const std::vector<uint8_t> bytes = file.build();
+  std::ofstream(path("take.mcp"), std::ios::binary)
+      .write(reinterpret_cast<const char*>(bytes.data()), std::streamsize(bytes.size()));
+
+  CliRun run = anvil("info " + path("take.mcp"));
+  ASSERT_EQ(run.code, 0) << run.output;
+  for (const char* line : {"frame rate: 60 Hz", "animation range: 5..8 (4 frames)", "up axis: Y",
+                           "labelled markers: 2", "unlabelled markers: 1", "subjects: 1"})
+    EXPECT_NE(run.output.find(line), std::string::npos) << line << "\n" << run.output;
+  EXPECT_NE(run.output.find("Camera 2"), std::string::npos) << run.output;
+
+  run = anvil("export " + path("take.mcp") + " -o " + path("take.trc"));
+  ASSERT_EQ(run.code, 0) << run.output;
+  std::ifstream trc(path("take.trc"));
+  std::string line;
+  for (int i = 0; i < 3; ++i)
+    std::getline(trc, line);
+  EXPECT_EQ(line.rfind("60.000000\t60.000000\t4\t3\tmm\t60.000000\t1\t4", 0), 0u) << line;
+
+  // A file that is not a recording: exit 2 naming it, nothing written.
+  std::ofstream(path("junk.mcp")) << "not a recording";
+  run = anvil("export " + path("junk.mcp") + " -o " + path("out.trc"));
+  EXPECT_EQ(run.code, 2) << run.output;
+  EXPECT_NE(run.output.find(path("junk.mcp") + ": not an MCP file"), std::string::npos)
+      << run.output;
+  EXPECT_FALSE(fs::exists(path("out.trc")));
 }
