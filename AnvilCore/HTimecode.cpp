@@ -1,4 +1,5 @@
 // Timecode of the scene clock: the mode names a standard, times become h:m:s:f plus subframes.
+#include "TimecodeModes.h"
 #include "plugin/host/HTimeManager.h"
 #include <numeric>
 
@@ -31,6 +32,12 @@ int64_t framesPerDay(uint32_t i_standard) {
   return int64_t(ZMT::timecodeFramesPerSecond(i_standard)) * 86400;
 }
 } // namespace
+
+int AnvilCore::timecodeModeOfStandard(uint32_t i_standard) {
+  for (int mode = 0; mode < kModesWithStandard; ++mode)
+    if (kStandardOfMode[mode] == i_standard) return mode;
+  return -1;
+}
 
 bool HTimeManager::isTimecodeSupported() const {
   return m_timecodeMode >= 0 && m_timecodeMode < kModesWithStandard;

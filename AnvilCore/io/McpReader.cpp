@@ -103,6 +103,21 @@ void readOrientation(const Cat::VFlowSceneOrientation& i_rItem, McpContent& io_r
   io_rContent.zUp = zUp;
 }
 
+// Each subject's local pose in the frame; a subject given twice keeps its first pose.
+void readLocalPoses(const ZMT::IFlowState& i_rState, HTime i_time, McpContent& io_rContent) {
+  ZMT::VItemHandles poses;
+  i_rState.GetItems(poses, Cat::VFlowSubjectLocalPose::FlowTypeId, ZMT::EMatch::Equal,
+                    i_rState.GetTime());
+  for (const IFlowItemHandle& item : poses) {
+    const auto* pPose = asType<Cat::VFlowSubjectLocalPose>(item);
+    if (!pPose) continue;
+    McpMotion& motion = io_rContent.motions[pPose->m_SubjectId];
+    if (!motion.times.empty() && motion.times.back() == i_time) continue;
+    motion.times.push_back(i_time);
+    motion.poses.push_back(pPose->m_Segments);
+  }
+}
+
 // The labeling setup's records of each subject, paired by subject id. A subject whose setups
 // don't build is left out, with the reason.
 void readSubjects(const std::vector<IFlowItemHandle>& i_rItems, McpContent& io_rContent) {
@@ -430,6 +445,13 @@ bool readMcp(ZMT::IInputStreamSeekable& io_rStream, McpContent& o_rContent, std:
       if (const auto* pOrientation = firstIn<Cat::VFlowSceneOrientation>(*state))
         readOrientation(*pOrientation, o_rContent);
     gatherer.frame(*state, time);
+    readLocalPoses(*state, time, o_rContent);
+    if (!o_rContent.timecode)
+      if (const auto* pTimecode = firstIn<Cat::VFlowTimecode>(*state);
+          pTimecode && pTimecode->isValid()) {
+        o_rContent.timecode = static_cast<const ZMT::ITimecode<135000000>&>(*pTimecode);
+        o_rContent.timecodeTick = entry.m_Tick;
+      }
     o_rContent.lastTime = time;
     ++o_rContent.frameCount;
   }

@@ -4,10 +4,13 @@
 // touches the scene; McpReaderScene.cpp adds the content in one step.
 #include "AnvilCore/OpticalCameraFromRecords.h"
 #include "AnvilCore/SubjectSetupBuilder.h"
+#include "Flow2/Flow2Types/ITimecode.h"
+#include "River/CoreOstraTypes/VSubjectStateData.h"
 #include "Utils/UtilsFileSystem/Streams.h"
 #include "plugin/host/HTime.h"
 #include "plugin/host/Vec3.h"
 #include <cstdint>
+#include <map>
 #include <optional>
 #include <string>
 #include <vector>
@@ -33,6 +36,13 @@ struct McpCamera {
   CameraRecords records() const;
 };
 
+/// A subject's labeling bones frame by frame, from its local poses: one record per segment in
+/// the setup's depth-first bone order.
+struct McpMotion {
+  std::vector<HTime> times;
+  std::vector<std::vector<CoreOstraTypes::VSubjectPoseRecord>> poses;
+};
+
 struct McpContent {
   /// Ticks per frame of the recorded frames; 0 when the file holds no frame.
   std::int64_t ticksPerFrame = 0;
@@ -44,6 +54,11 @@ struct McpContent {
   /// Subjects of the labeling setup whose setups build, by ascending subject id.
   std::vector<SubjectRecords> subjects;
   std::vector<McpCamera> cameras;
+  /// The timecode of the first frame that has a valid one, and the state tick it labels.
+  std::optional<ZMT::ITimecode<135000000>> timecode;
+  HTime timecodeTick = 0;
+  /// Local poses of the subjects, by subject id.
+  std::map<std::uint32_t, McpMotion> motions;
   /// The scene's up axis when the file says it.
   std::optional<bool> zUp;
   /// What was repaired, left out or found damaged, one line each.
