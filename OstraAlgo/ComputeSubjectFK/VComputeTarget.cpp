@@ -294,6 +294,29 @@ void VComputeRigidBody::ResidualJacobian(ConstView, JacobianRef o_rJacobian) con
 
 // --- Factory ------------------------------------------------------------------------------
 
+// Each run-time target re-reads its model target by being built again in place; the model
+// target's class is the one it was made from.
+void VComputeTargetPosition::Rebind(const VComputeSegment* parent) {
+  *this = VComputeTargetPosition(*m_pTarget, parent);
+}
+void VComputeTargetSegmentPlane::Rebind(const VComputeSegment* parent) {
+  *this = VComputeTargetSegmentPlane(static_cast<const VTargetSegmentPlane&>(*m_pTarget), parent);
+}
+void VComputeTargetSegmentRay::Rebind(const VComputeSegment* parent) {
+  *this = VComputeTargetSegmentRay(static_cast<const VTargetSegmentRay&>(*m_pTarget), parent);
+}
+void VComputeTargetDirection::Rebind(const VComputeSegment* parent) {
+  *this = VComputeTargetDirection(static_cast<const VTargetDirection&>(*m_pTarget), parent);
+}
+void VComputeTargetOrientation::Rebind(const VComputeSegment* parent) {
+  *this = VComputeTargetOrientation(static_cast<const VTargetOrientation&>(*m_pTarget), parent);
+}
+void VComputeRigidBody::Rebind(const VComputeSegment* parent) {
+  std::vector<double> weights = std::move(m_Weights);
+  *this = VComputeRigidBody(static_cast<const VTargetRigidBody&>(*m_pTarget), parent);
+  if (weights.size() == m_Weights.size()) m_Weights = std::move(weights);
+}
+
 std::unique_ptr<IComputeTarget> MakeComputeTarget(const ITargetCalibrated& target,
                                                   const VComputeSegment* parent) {
   const char* key = target.Key();

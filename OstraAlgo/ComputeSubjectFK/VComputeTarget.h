@@ -28,6 +28,10 @@ public:
   virtual std::uint32_t NumParams() const = 0;
   /// Recomputes the world quantity from the parent's current pose.
   virtual void Update() = 0;
+  /// Reads the model target's geometry again and binds to `parent` (null: unbound). Settings
+  /// of the run-time target that the model does not hold (member weights) are kept where they
+  /// still apply.
+  virtual void Rebind(const VComputeSegment* parent) = 0;
   /// The message of a failed binding, empty when bound.
   virtual const std::string& Errors() const = 0;
 
@@ -93,6 +97,7 @@ public:
   VComputeTargetPosition(const KinematicAlgo::ITargetCalibrated& target,
                          const VComputeSegment* parent);
   void Update() override;
+  void Rebind(const VComputeSegment* parent) override;
   void ValueJacobian(JacobianRef o_rJacobian) const override { Jacobian(o_rJacobian); }
   std::uint32_t ObservationSize() const override { return 3; }
   std::uint32_t NumResiduals() const override { return 3; }
@@ -121,6 +126,7 @@ public:
   VComputeTargetSegmentPlane(const KinematicAlgo::VTargetSegmentPlane& target,
                              const VComputeSegment* parent);
   void Update() override;
+  void Rebind(const VComputeSegment* parent) override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 3; }
   std::uint32_t NumResiduals() const override { return 1; }
@@ -142,6 +148,7 @@ public:
   VComputeTargetSegmentRay(const KinematicAlgo::VTargetSegmentRay& target,
                            const VComputeSegment* parent);
   void Update() override;
+  void Rebind(const VComputeSegment* parent) override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 3; }
   std::uint32_t NumResiduals() const override { return 2; }
@@ -162,6 +169,7 @@ public:
   VComputeTargetDirection(const KinematicAlgo::VTargetDirection& target,
                           const VComputeSegment* parent);
   void Update() override;
+  void Rebind(const VComputeSegment* parent) override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 3; }
   std::uint32_t NumResiduals() const override { return 3; }
@@ -181,6 +189,7 @@ public:
   VComputeTargetOrientation(const KinematicAlgo::VTargetOrientation& target,
                             const VComputeSegment* parent);
   void Update() override;
+  void Rebind(const VComputeSegment* parent) override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 9; }
   std::uint32_t NumResiduals() const override { return 9; }
@@ -200,6 +209,7 @@ class VComputeRigidBody : public VComputeTargetSingleParent {
 public:
   VComputeRigidBody(const KinematicAlgo::VTargetRigidBody& target, const VComputeSegment* parent);
   void Update() override;
+  void Rebind(const VComputeSegment* parent) override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 3 * NumMembers(); }
   std::uint32_t NumResiduals() const override;
