@@ -36,6 +36,13 @@ public:
   void SetDirectionInParent(const Eigen::Vector3d& d) override { m_Direction = d; }
   const Eigen::MatrixXd& ResidualCovariance() const override { return m_ResidualCovariance; }
   void SetResidualCovariance(const Eigen::MatrixXd& c) override { m_ResidualCovariance = c; }
+  /// The point, then the direction under the label of the class, then the residual covariance.
+  void Write(std::ostream& o_rStream) const override;
+  bool Read(VTextReader& io_rReader) override;
+
+protected:
+  /// "NormalInParent: " for the plane, "DirInParent: " for the others.
+  virtual const char* DirectionLabel() const { return "DirInParent: "; }
 
 private:
   Eigen::Vector3d m_Direction = Eigen::Vector3d::UnitZ();
@@ -51,6 +58,9 @@ public:
     return std::make_shared<VTargetSegmentPlane>(*this);
   }
   const char* Key() const override { return "TargetSegmentPlane"; }
+
+protected:
+  const char* DirectionLabel() const override { return "NormalInParent: "; }
 };
 
 /// A ray from PositionInParent() along DirectionInParent(): "TargetSegmentRay". Its residual is
@@ -86,6 +96,8 @@ public:
   const char* Key() const override { return "TargetOrientation"; }
   const Eigen::Matrix3d& OrientationInParent() const { return m_Orientation; }
   void SetOrientationInParent(const Eigen::Matrix3d& r) { m_Orientation = r; }
+  void Write(std::ostream& o_rStream) const override;
+  bool Read(VTextReader& io_rReader) override;
 
 private:
   Eigen::Matrix3d m_Orientation = Eigen::Matrix3d::Identity();
@@ -108,6 +120,9 @@ public:
   const VTargetPosition& Member(std::uint32_t i) const { return *m_Members[i]; }
   std::shared_ptr<VTargetPosition> MemberPtr(std::uint32_t i) const { return m_Members[i]; }
   void AddMember(std::shared_ptr<VTargetPosition> member) { m_Members.push_back(member); }
+  /// Its own header (group name, identifier, parent, body pose), then the members.
+  void Write(std::ostream& o_rStream) const override;
+  bool Read(VTextReader& io_rReader) override;
 
 private:
   VPose m_Body;
