@@ -174,6 +174,9 @@ public:
   bool Read(std::istream& io_rStream, std::string* o_pError = nullptr) override;
   /// Reads from text in memory; as Read otherwise.
   bool ReadText(std::string_view text, std::string* o_pError = nullptr);
+  /// Reads one subject from `io_rReader`, leaving the reader after it (for files that hold more
+  /// than a subject). False with the reader's error set, and this subject unchanged, on failure.
+  bool ReadFrom(VTextReader& io_rReader);
 
   /// Replaces the tree by an empty one.
   void ClearSegments() { m_Tree = SegmentTree(); }

@@ -252,14 +252,17 @@ bool VSubjectCalibrated::Read(std::istream& io_rStream, std::string* o_pError) {
 }
 
 bool VSubjectCalibrated::ReadText(std::string_view text, std::string* o_pError) {
+  VTextReader r(text);
+  if (ReadFrom(r) && (r.AtEnd() || r.Fail("unexpected text after the subject"))) return true;
+  if (o_pError) *o_pError = r.Error();
+  return false;
+}
+
+bool VSubjectCalibrated::ReadFrom(VTextReader& r) {
   // Everything is read into a new subject first; this one changes only on success.
   VSubjectCalibrated read;
   read.ClearSegments();
-  VTextReader r(text);
-  const auto fail = [&] {
-    if (o_pError) *o_pError = r.Error();
-    return false;
-  };
+  const auto fail = [] { return false; };
   // Counts are bounded by the text left: every item takes a few bytes at least.
   const auto bound = [&] { return std::uint32_t(std::min<size_t>(r.Remaining(), UINT32_MAX)); };
   std::uint32_t count = 0;
@@ -316,7 +319,6 @@ bool VSubjectCalibrated::ReadText(std::string_view text, std::string* o_pError) 
       stick.m_Colour[size_t(c)] = std::uint8_t(colour[c]);
     read.m_Sticks.push_back(stick);
   }
-  if (!r.AtEnd()) return r.Fail("unexpected text after the subject"), fail();
   m_Tree = std::move(read.m_Tree);
   m_Targets = std::move(read.m_Targets);
   m_Markers = std::move(read.m_Markers);
