@@ -32,9 +32,13 @@ void VComputeSubject::Build() {
   for (std::uint32_t t = 0; t < m_pSubject->NumTargets(); ++t) {
     const auto target = m_pSubject->Target(t);
     m_ModelTargets.push_back(target);
-    const auto* single = dynamic_cast<const ITargetSingleParent*>(target.get());
-    if (!single) continue;
-    auto computed = MakeComputeTarget(*target, SegmentByIdentifier(single->ParentIdentifier()));
+    std::unique_ptr<IComputeTarget> computed;
+    if (const auto* two = dynamic_cast<const VTargetRelativePosition*>(target.get()))
+      computed = std::make_unique<VComputeTargetRelativePosition>(
+          *two, SegmentByIdentifier(two->ParentIdentifier1()),
+          SegmentByIdentifier(two->ParentIdentifier2()));
+    else if (const auto* single = dynamic_cast<const ITargetSingleParent*>(target.get()))
+      computed = MakeComputeTarget(*target, SegmentByIdentifier(single->ParentIdentifier()));
     if (!computed) continue;
     m_NumTargetParams += computed->NumParams();
     m_Targets.push_back(std::move(computed));
@@ -248,7 +252,13 @@ bool VComputeSubject::ReloadFromModel(std::string* o_pWhy) {
     s.Reload();
   for (auto& target : m_Targets) {
     const auto* single = dynamic_cast<const ITargetSingleParent*>(&target->Target());
-    target->Rebind(single ? SegmentByIdentifier(single->ParentIdentifier()) : nullptr);
+    const auto* two = dynamic_cast<const ITargetTwoParents*>(&target->Target());
+    if (auto* relative = dynamic_cast<VComputeTargetRelativePosition*>(target.get());
+        relative && two)
+      relative->Rebind(SegmentByIdentifier(two->ParentIdentifier1()),
+                       SegmentByIdentifier(two->ParentIdentifier2()));
+    else
+      target->Rebind(single ? SegmentByIdentifier(single->ParentIdentifier()) : nullptr);
   }
   m_Chains.clear();
   m_FirstTime = true;
@@ -292,7 +302,12 @@ VComputeSubject::VTgtChainInfo* VComputeSubject::Chain(std::uint32_t index) {
 const IComputeTarget& VComputeSubject::UpdateTarget(std::uint32_t index, ConstView state,
                                                     std::uint32_t type) {
   VTgtChainInfo* info = Chain(index);
-  if (!info) return *m_Targets[index];
+  if (!info) {
+    // Targets on more than one segment have no single chain: the whole tree is evaluated.
+    if (!dynamic_cast<const VComputeTargetSingleParent*>(m_Targets[index].get()))
+      UpdateSegments(state, type);
+    return *m_Targets[index];
+  }
   double* compact = info->m_State.data();
   for (const auto& [first, end] : info->m_Runs)
     compact = std::copy(state.begin() + first, state.begin() + end, compact);

@@ -133,7 +133,8 @@ public:
   /// segments from the root to its parent only, then the target. Returns the evaluated target,
   /// which is the chain's own copy: the subject's segments, targets and state cache are left as
   /// they were. Its Jacobian columns are those of the full state. A target with no segment in
-  /// the tree is returned as it is. Chains are built on first use.
+  /// the tree is returned as it is; a target on two segments is evaluated with the whole tree
+  /// (UpdateSegments) and returned. Chains are built on first use.
   const IComputeTarget& UpdateTarget(std::uint32_t index, ConstView state, std::uint32_t type);
   /// The chain of target `index` (built if needed); null for a target with no segment.
   const VTgtChainInfo* ChainInfo(std::uint32_t index) { return Chain(index); }

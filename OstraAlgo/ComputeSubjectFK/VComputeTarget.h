@@ -228,6 +228,58 @@ private:
   std::vector<double> m_Weights;
 };
 
+/// A point fixed in a segment held to a plane fixed in the world. Values: the world position.
+/// Residual (1, no observation): n · x - d, n the plane's unit normal.
+class VComputeTargetPlane : public VComputeTargetSingleParent {
+public:
+  VComputeTargetPlane(const KinematicAlgo::VTargetPlane& target, const VComputeSegment* parent);
+  void Update() override;
+  void Rebind(const VComputeSegment* parent) override;
+  void ValueJacobian(JacobianRef o_rJacobian) const override;
+  std::uint32_t ObservationSize() const override { return 0; }
+  std::uint32_t NumResiduals() const override { return 1; }
+  void Residual(ConstView observation, View o_rResidual) const override;
+  void ResidualJacobian(ConstView observation, JacobianRef o_rJacobian) const override;
+
+private:
+  Eigen::Vector3d m_Local;
+  Eigen::Vector3d m_Normal;
+  double m_Offset;
+};
+
+/// The world offset x1 - x2 between a point fixed in one segment and a point fixed in another.
+/// Values (3): the offset. Residual (3): offset - observed.
+class VComputeTargetRelativePosition : public IComputeTarget {
+public:
+  /// Either parent null leaves the target unbound: "VComputeTargetRelativePosition cannot find
+  /// segment. ", values zero, derivatives zero.
+  VComputeTargetRelativePosition(const KinematicAlgo::VTargetRelativePosition& target,
+                                 const VComputeSegment* first, const VComputeSegment* second);
+  const KinematicAlgo::ITargetCalibrated& Target() const override { return *m_pTarget; }
+  std::uint32_t NumParams() const override { return 0; }
+  void Update() override;
+  /// Rebinding to one parent is not enough for this target: it becomes unbound.
+  void Rebind(const VComputeSegment*) override { Rebind(nullptr, nullptr); }
+  void Rebind(const VComputeSegment* first, const VComputeSegment* second);
+  const std::string& Errors() const override { return m_Errors; }
+  std::uint32_t NumValues() const override { return 3; }
+  ConstView Values() const override { return {m_Values.data(), 3}; }
+  void ValueJacobian(JacobianRef o_rJacobian) const override;
+  std::uint32_t ObservationSize() const override { return 3; }
+  std::uint32_t NumResiduals() const override { return 3; }
+  void Residual(ConstView observation, View o_rResidual) const override;
+  void ResidualJacobian(ConstView observation, JacobianRef o_rJacobian) const override {
+    ValueJacobian(o_rJacobian);
+  }
+
+private:
+  const KinematicAlgo::VTargetRelativePosition* m_pTarget;
+  std::array<const VComputeSegment*, 2> m_Parents;
+  std::array<Eigen::Vector3d, 2> m_Local;
+  Eigen::Vector3d m_Values = Eigen::Vector3d::Zero();
+  std::string m_Errors;
+};
+
 /// The run-time target of a model target, bound to `parent` (null when its segment is not in
 /// the tree). Null for a model class without a run-time form.
 std::unique_ptr<IComputeTarget> MakeComputeTarget(const KinematicAlgo::ITargetCalibrated& target,

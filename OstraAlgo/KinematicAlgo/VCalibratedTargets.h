@@ -129,6 +129,76 @@ private:
   std::vector<std::shared_ptr<VTargetPosition>> m_Members;
 };
 
+/// A point fixed in its segment that should lie on a plane fixed in the world: "TargetPlane".
+/// The plane is the points x with n · x = d (n as given, normalised by the run-time target).
+class VTargetPlane : public VTargetPosition {
+public:
+  using VTargetPosition::VTargetPosition;
+  std::shared_ptr<ITargetCalibrated> Clone() const override {
+    return std::make_shared<VTargetPlane>(*this);
+  }
+  bool Equals(const ITargetCalibrated& other) const override;
+  const char* Key() const override { return "TargetPlane"; }
+  const Eigen::Vector3d& WorldNormal() const { return m_Normal; }
+  double WorldOffset() const { return m_Offset; }
+  void SetWorldPlane(const Eigen::Vector3d& normal, double offset) {
+    m_Normal = normal;
+    m_Offset = offset;
+  }
+  void Write(std::ostream& o_rStream) const override;
+  bool Read(VTextReader& io_rReader) override;
+
+private:
+  Eigen::Vector3d m_Normal = Eigen::Vector3d::UnitZ();
+  double m_Offset = 0.0;
+};
+
+/// A target between two segments.
+class ITargetTwoParents {
+public:
+  virtual ~ITargetTwoParents() = default;
+  virtual std::uint32_t ParentIdentifier1() const = 0;
+  virtual std::uint32_t ParentIdentifier2() const = 0;
+  virtual void SetParentIdentifiers(std::uint32_t first, std::uint32_t second) = 0;
+  virtual const Eigen::Vector3d& PositionInParent1() const = 0;
+  virtual const Eigen::Vector3d& PositionInParent2() const = 0;
+  virtual void SetPositionsInParents(const Eigen::Vector3d& first,
+                                     const Eigen::Vector3d& second) = 0;
+};
+
+/// The offset between a point fixed in one segment and a point fixed in another:
+/// "TargetRelativePosition".
+class VTargetRelativePosition : public ITargetCalibrated, public ITargetTwoParents {
+public:
+  std::shared_ptr<ITargetCalibrated> Clone() const override {
+    return std::make_shared<VTargetRelativePosition>(*this);
+  }
+  bool Equals(const ITargetCalibrated& other) const override;
+  const char* Key() const override { return "TargetRelativePosition"; }
+  std::int32_t Identifier() const override { return m_Identifier; }
+  void SetIdentifier(std::int32_t id) override { m_Identifier = id; }
+  const std::string& Name() const override { return m_Name; }
+  void SetName(const std::string& name) override { m_Name = name; }
+  std::uint32_t ParentIdentifier1() const override { return m_Parents[0]; }
+  std::uint32_t ParentIdentifier2() const override { return m_Parents[1]; }
+  void SetParentIdentifiers(std::uint32_t first, std::uint32_t second) override {
+    m_Parents = {first, second};
+  }
+  const Eigen::Vector3d& PositionInParent1() const override { return m_Positions[0]; }
+  const Eigen::Vector3d& PositionInParent2() const override { return m_Positions[1]; }
+  void SetPositionsInParents(const Eigen::Vector3d& first, const Eigen::Vector3d& second) override {
+    m_Positions = {first, second};
+  }
+  void Write(std::ostream& o_rStream) const override;
+  bool Read(VTextReader& io_rReader) override;
+
+private:
+  std::string m_Name;
+  std::int32_t m_Identifier = -1;
+  std::array<std::uint32_t, 2> m_Parents{};
+  std::array<Eigen::Vector3d, 2> m_Positions{Eigen::Vector3d::Zero(), Eigen::Vector3d::Zero()};
+};
+
 /// Registers every model target class with `factory`, in a fixed order (the order gives Type()).
 void RegisterModelTargets(VTargetFactory& factory);
 

@@ -194,6 +194,38 @@ bool VTargetRigidBody::Read(VTextReader& r) {
   return true;
 }
 
+void VTargetPlane::Write(std::ostream& o) const {
+  VTargetPosition::Write(o);
+  const double plane[] = {m_Normal[0], m_Normal[1], m_Normal[2], m_Offset};
+  Text::Numbers(o, "WorldPlane: ", plane, 4);
+  o << '\n';
+}
+
+bool VTargetPlane::Read(VTextReader& r) {
+  double plane[4];
+  if (!VTargetPosition::Read(r) || !r.Label("WorldPlane: ") || !r.Numbers(plane, 4)) return false;
+  m_Normal = Eigen::Vector3d(plane[0], plane[1], plane[2]);
+  m_Offset = plane[3];
+  return true;
+}
+
+void VTargetRelativePosition::Write(std::ostream& o) const {
+  Text::String(o, "Target: ", m_Name);
+  o << " ID: " << m_Identifier << '\n'
+    << "ParentID1: " << m_Parents[0] << " ParentID2: " << m_Parents[1] << '\n';
+  Text::Numbers(o, " PosInParent1: ", m_Positions[0].data(), 3);
+  Text::Numbers(o, " PosInParent2: ", m_Positions[1].data(), 3);
+  o << '\n';
+}
+
+bool VTargetRelativePosition::Read(VTextReader& r) {
+  return r.String("Target: ", m_Name) && r.Label(" ID: ") && r.Int(m_Identifier) &&
+         r.Label("ParentID1: ") && r.UInt(m_Parents[0]) && r.Label(" ParentID2: ") &&
+         r.UInt(m_Parents[1]) && r.Label(" PosInParent1: ") &&
+         r.Numbers(m_Positions[0].data(), 3) && r.Label(" PosInParent2: ") &&
+         r.Numbers(m_Positions[1].data(), 3);
+}
+
 // --- Subject ------------------------------------------------------------------------------
 
 namespace {
