@@ -20,13 +20,18 @@ JointGaussian Prior(const Eigen::VectorXd& mean, const Eigen::MatrixXd& covarian
 VComputeSegment::VComputeSegment(const ISegmentCalibrated& segment, bool useRotator,
                                  bool freeSegment)
     : m_pSegment(&segment), m_UsesRotator(useRotator), m_FreeSegment(freeSegment) {
-  const auto joint = segment.Joint();
+  ReadModel();
+}
+
+void VComputeSegment::ReadModel() {
+  const auto joint = m_pSegment->Joint();
+  m_JointType = joint ? joint->Type() : -1;
   std::unique_ptr<VJointFunctional> functional =
       joint ? MakeJointFunctional(joint->Type()) : nullptr;
   m_A = joint ? Exp(joint->Rotation()) : Matrix3r::Identity();
-  m_P = segment.PoseInParent();
-  m_Q = segment.PoseInThis();
-  if (useRotator && functional) {
+  m_P = m_pSegment->PoseInParent();
+  m_Q = m_pSegment->PoseInThis();
+  if (m_UsesRotator && functional) {
     functional = std::make_unique<VJointFunctionalRotator>(std::move(functional), m_A);
   } else {
     m_P.m_Rotation = m_P.m_Rotation * m_A;
@@ -35,14 +40,14 @@ VComputeSegment::VComputeSegment(const ISegmentCalibrated& segment, bool useRota
   m_QInverse = m_Q.Inverse();
   m_ModelP = m_P;
   VJointFunctionalFree().ComputeParams(View(m_FreeParams), View(), m_P, 1e10);
-  if (freeSegment) {
+  if (m_FreeSegment) {
     // P becomes the free joint's transform; the model's joint takes no part.
     functional = std::make_unique<VJointFunctionalFree>();
     m_P = VPose();
   }
   m_pJoint = std::move(functional);
   m_NumParams = m_pJoint ? m_pJoint->NumDynamicParams() : 0;
-  if (joint && !freeSegment) {
+  if (joint && !m_FreeSegment) {
     m_DynamicPrior = Prior(joint->MeanDynamic(), joint->CovDynamic(), m_NumParams);
     m_RangePrior = Prior(joint->CentreDynamic(), joint->RangeDynamic(), m_NumParams);
   } else {
@@ -50,6 +55,14 @@ VComputeSegment::VComputeSegment(const ISegmentCalibrated& segment, bool useRota
   }
   m_CurrentPrior = m_DynamicPrior;
   m_Own = JointJacobian(m_NumParams);
+  m_Own.m_FirstParam = m_FirstParam;
+}
+
+bool VComputeSegment::Reload() {
+  const auto joint = m_pSegment->Joint();
+  if ((joint ? joint->Type() : -1) != m_JointType) return false;
+  ReadModel();
+  return true;
 }
 
 VComputeSegment::VComputeSegment(const VComputeSegment& other)
@@ -57,9 +70,9 @@ VComputeSegment::VComputeSegment(const VComputeSegment& other)
                               : nullptr),
       m_pSegment(other.m_pSegment), m_Index(other.m_Index), m_Parent(other.m_Parent),
       m_NumParams(other.m_NumParams), m_FirstParam(other.m_FirstParam),
-      m_UsesRotator(other.m_UsesRotator), m_A(other.m_A), m_P(other.m_P), m_Q(other.m_Q),
-      m_QInverse(other.m_QInverse), m_Joint(other.m_Joint), m_Local(other.m_Local),
-      m_World(other.m_World), m_JointFrame(other.m_JointFrame),
+      m_JointType(other.m_JointType), m_UsesRotator(other.m_UsesRotator), m_A(other.m_A),
+      m_P(other.m_P), m_Q(other.m_Q), m_QInverse(other.m_QInverse), m_Joint(other.m_Joint),
+      m_Local(other.m_Local), m_World(other.m_World), m_JointFrame(other.m_JointFrame),
       m_DynamicPrior(other.m_DynamicPrior), m_CurrentPrior(other.m_CurrentPrior),
       m_RangePrior(other.m_RangePrior), m_Own(other.m_Own), m_Blocks(other.m_Blocks),
       m_NumBlocks(other.m_NumBlocks), m_FreeSegment(other.m_FreeSegment), m_ModelP(other.m_ModelP),

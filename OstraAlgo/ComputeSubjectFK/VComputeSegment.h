@@ -40,6 +40,10 @@ public:
   VComputeSegment& operator=(const VComputeSegment&) = delete;
 
   const KinematicAlgo::ISegmentCalibrated& Segment() const { return *m_pSegment; }
+  /// Reads P, Q, the fixed rotation and the priors from the model segment again (the working
+  /// prior returns to the dynamic one). False, with nothing changed, when the joint's type is no
+  /// longer the one this segment was built with: its parameter count may differ.
+  bool Reload();
   const KinematicAlgo::VJointFunctional* Joint() const { return m_pJoint.get(); }
   std::uint32_t NumParams() const { return m_NumParams; }
   /// Position in the tree and of the parent (-1 at the root).
@@ -90,6 +94,8 @@ private:
   void UpdateJacobian(const double* params, const VComputeSegment* parent, std::uint32_t type);
   /// The EFree block: `params` are the segment's own (used in free mode only).
   void UpdateFreeJacobian(const double* params, const VComputeSegment* parent);
+  /// Everything the segment takes from the model.
+  void ReadModel();
 
   std::shared_ptr<KinematicAlgo::VJointFunctional> m_pJoint;
   const KinematicAlgo::ISegmentCalibrated* m_pSegment;
@@ -97,6 +103,7 @@ private:
   std::int32_t m_Parent = -1;
   std::uint32_t m_NumParams = 0;
   std::uint32_t m_FirstParam = 0;
+  std::int32_t m_JointType = -1;
   bool m_UsesRotator;
   Matrix3r m_A;
   VPose m_P;

@@ -23,28 +23,35 @@ VComputeSubject::VComputeSubject(const VComputeSubject& other)
 void VComputeSubject::Build() {
   const SegmentTree& tree = m_pSubject->Segments();
   m_Segments.reserve(size_t(tree.Size())); // targets keep pointers into this vector
-  std::map<std::int32_t, std::int32_t> byIdentifier;
   for (std::int32_t i = 0; i < tree.Size(); ++i) {
     if (!tree[i].m_Value) throw VConstructionException("VComputeSubject: a segment is missing");
     m_Segments.emplace_back(*tree[i].m_Value, m_UseRotator != 0, m_Mode == EFreeSegmentsMode);
     m_Segments.back().SetUp(i, tree[i].m_Parent, m_NumJointParams, std::uint32_t(tree.Depth(i)));
     m_NumJointParams += m_Segments.back().NumParams();
-    byIdentifier.emplace(tree[i].m_Value->Identifier(), i);
   }
   for (std::uint32_t t = 0; t < m_pSubject->NumTargets(); ++t) {
     const auto target = m_pSubject->Target(t);
-    const auto* single = dynamic_cast<const ITargetSingleParent*>(target.get());
-    if (!single) continue;
-    const auto it = byIdentifier.find(std::int32_t(single->ParentIdentifier()));
-    const VComputeSegment* parent =
-        it == byIdentifier.end() ? nullptr : &m_Segments[size_t(it->second)];
-    auto computed = MakeComputeTarget(*target, parent);
+    m_ModelTargets.push_back(target);
+    std::unique_ptr<IComputeTarget> computed;
+    if (const auto* two = dynamic_cast<const VTargetRelativePosition*>(target.get()))
+      computed = std::make_unique<VComputeTargetRelativePosition>(
+          *two, SegmentByIdentifier(two->ParentIdentifier1()),
+          SegmentByIdentifier(two->ParentIdentifier2()));
+    else if (const auto* single = dynamic_cast<const ITargetSingleParent*>(target.get()))
+      computed = MakeComputeTarget(*target, SegmentByIdentifier(single->ParentIdentifier()));
     if (!computed) continue;
     m_NumTargetParams += computed->NumParams();
     m_Targets.push_back(std::move(computed));
   }
   m_Cache.assign(NumParams(), 0.0);
   m_FirstTime = true;
+}
+
+const VComputeSegment* VComputeSubject::SegmentByIdentifier(std::uint32_t id) const {
+  // The first segment with the identifier, as a map filled in tree order would give.
+  for (const VComputeSegment& segment : m_Segments)
+    if (segment.Segment().Identifier() == std::int32_t(id)) return &segment;
+  return nullptr;
 }
 
 const VComputeTargetPosition* VComputeSubject::PositionTarget(std::uint32_t i) const {
@@ -214,6 +221,106 @@ bool VComputeSubject::WriteToModel(ISubjectCalibrated& io_rModel) const {
     tree[std::int32_t(i)].m_Value->SetPoseInThis(Q);
   }
   return true;
+}
+
+} // namespace ComputeSubject
+
+namespace ComputeSubject {
+
+bool VComputeSubject::ReloadFromModel(std::string* o_pWhy) {
+  const auto fail = [&](const std::string& why) {
+    if (o_pWhy) *o_pWhy = why;
+    return false;
+  };
+  const SegmentTree& tree = m_pSubject->Segments();
+  if (tree.Size() != std::int32_t(m_Segments.size()))
+    return fail("the model's tree has another number of segments");
+  for (std::int32_t i = 0; i < tree.Size(); ++i) {
+    const VComputeSegment& s = m_Segments[size_t(i)];
+    if (tree[i].m_Value.get() != &s.Segment() || tree[i].m_Parent != s.ParentIndex())
+      return fail("the model's tree changed at segment " + s.Segment().Name());
+    const auto joint = tree[i].m_Value->Joint();
+    if ((joint ? joint->Type() : -1) != s.m_JointType)
+      return fail("the joint type of segment " + s.Segment().Name() + " changed");
+  }
+  if (m_pSubject->NumTargets() != m_ModelTargets.size())
+    return fail("the model has another number of targets");
+  for (std::uint32_t t = 0; t < m_pSubject->NumTargets(); ++t)
+    if (m_pSubject->Target(t) != m_ModelTargets[t])
+      return fail("the model's target " + std::to_string(t) + " was replaced");
+  for (VComputeSegment& s : m_Segments)
+    s.Reload();
+  for (auto& target : m_Targets) {
+    const auto* single = dynamic_cast<const ITargetSingleParent*>(&target->Target());
+    const auto* two = dynamic_cast<const ITargetTwoParents*>(&target->Target());
+    if (auto* relative = dynamic_cast<VComputeTargetRelativePosition*>(target.get());
+        relative && two)
+      relative->Rebind(SegmentByIdentifier(two->ParentIdentifier1()),
+                       SegmentByIdentifier(two->ParentIdentifier2()));
+    else
+      target->Rebind(single ? SegmentByIdentifier(single->ParentIdentifier()) : nullptr);
+  }
+  m_Chains.clear();
+  m_FirstTime = true;
+  return true;
+}
+
+void VComputeSubject::BuildChain(std::uint32_t index, VTgtChainInfo& o_rInfo) const {
+  const auto* bound = dynamic_cast<const VComputeTargetSingleParent*>(m_Targets[index].get());
+  // The path from the parent to the root, then reversed: every other node of the tree is
+  // pruned, with its subtree.
+  std::vector<std::int32_t> path;
+  for (std::int32_t s = bound->ParentIndex(); s >= 0; s = m_Segments[size_t(s)].ParentIndex())
+    path.push_back(s);
+  o_rInfo.m_Chain.reserve(path.size()); // the target keeps a pointer to the last one
+  for (auto it = path.rbegin(); it != path.rend(); ++it) {
+    const VComputeSegment& s = m_Segments[size_t(*it)];
+    o_rInfo.m_Chain.push_back(s);
+    o_rInfo.m_Offsets.push_back(std::uint32_t(o_rInfo.m_State.size()));
+    o_rInfo.m_State.resize(o_rInfo.m_State.size() + s.NumParams());
+    if (!s.NumParams()) continue;
+    const std::uint32_t first = s.FirstParam(), end = first + s.NumParams();
+    if (!o_rInfo.m_Runs.empty() && o_rInfo.m_Runs.back().second == first)
+      o_rInfo.m_Runs.back().second = end;
+    else
+      o_rInfo.m_Runs.emplace_back(first, end);
+  }
+  o_rInfo.m_pTarget = MakeComputeTarget(m_Targets[index]->Target(), &o_rInfo.m_Chain.back());
+}
+
+VComputeSubject::VTgtChainInfo* VComputeSubject::Chain(std::uint32_t index) {
+  const auto* bound = dynamic_cast<const VComputeTargetSingleParent*>(m_Targets[index].get());
+  if (!bound || bound->ParentIndex() < 0) return nullptr;
+  auto it = m_Chains.find(index);
+  if (it == m_Chains.end()) {
+    it = m_Chains.try_emplace(index).first;
+    BuildChain(index, it->second);
+  }
+  return &it->second;
+}
+
+const IComputeTarget& VComputeSubject::UpdateTarget(std::uint32_t index, ConstView state,
+                                                    std::uint32_t type) {
+  VTgtChainInfo* info = Chain(index);
+  if (!info) {
+    // Targets on more than one segment have no single chain: the whole tree is evaluated.
+    if (!dynamic_cast<const VComputeTargetSingleParent*>(m_Targets[index].get()))
+      UpdateSegments(state, type);
+    return *m_Targets[index];
+  }
+  double* compact = info->m_State.data();
+  for (const auto& [first, end] : info->m_Runs)
+    compact = std::copy(state.begin() + first, state.begin() + end, compact);
+  const bool poses = type < EChainOnly;
+  for (size_t k = 0; k < info->m_Chain.size(); ++k) {
+    VComputeSegment& segment = info->m_Chain[k];
+    const VComputeSegment* parent = k ? &info->m_Chain[k - 1] : nullptr;
+    const double* own = info->m_State.data() + info->m_Offsets[k];
+    if (poses) segment.UpdatePose(own, parent);
+    if (type != ENone) segment.UpdateJacobian(own, parent, type);
+  }
+  info->m_pTarget->Update();
+  return *info->m_pTarget;
 }
 
 } // namespace ComputeSubject

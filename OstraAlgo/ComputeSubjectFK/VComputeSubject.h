@@ -11,8 +11,10 @@
 #include "OstraAlgo/ComputeSubjectFK/VComputeSegment.h"
 #include "OstraAlgo/ComputeSubjectFK/VComputeTarget.h"
 
+#include <map>
 #include <memory>
 #include <random>
+#include <utility>
 #include <vector>
 
 namespace ComputeSubject {
@@ -102,18 +104,59 @@ public:
   /// out again. False, with `io_rModel` untouched, when its tree has another size.
   bool WriteToModel(KinematicAlgo::ISubjectCalibrated& io_rModel) const;
 
+  /// Reads every segment's fixed poses, joint rotation and priors, and every target's geometry,
+  /// from the model again, after the caller changed them. The tree's shape, its segment objects,
+  /// the joint types and the model's target list must be those the subject was built from; if
+  /// not, nothing changes, the reason goes to `o_pWhy` and the result is false (build a new
+  /// compute subject then). Working priors return to the dynamic priors; the next Update runs in
+  /// full.
+  bool ReloadFromModel(std::string* o_pWhy = nullptr);
+
+  /// What one target needs to be evaluated without the rest of the tree: copies of the segments
+  /// from the root to its parent, the ranges of the joint state they read, and the state
+  /// compacted to those ranges.
+  struct VTgtChainInfo {
+    /// Root first, the target's parent last; each is the parent of the next.
+    std::vector<VComputeSegment> m_Chain;
+    /// Each chain segment's first parameter in m_State.
+    std::vector<std::uint32_t> m_Offsets;
+    /// Half-open ranges [first, end) of the full state read by the chain, in order; ranges that
+    /// touch are merged.
+    std::vector<std::pair<std::uint32_t, std::uint32_t>> m_Runs;
+    /// The compacted state: the runs one after another.
+    std::vector<double> m_State;
+    /// The target, bound to m_Chain.back().
+    std::unique_ptr<IComputeTarget> m_pTarget;
+  };
+
+  /// Evaluates target `index` alone: forward kinematics (and Jacobian blocks of `type`) of the
+  /// segments from the root to its parent only, then the target. Returns the evaluated target,
+  /// which is the chain's own copy: the subject's segments, targets and state cache are left as
+  /// they were. Its Jacobian columns are those of the full state. A target with no segment in
+  /// the tree is returned as it is; a target on two segments is evaluated with the whole tree
+  /// (UpdateSegments) and returned. Chains are built on first use.
+  const IComputeTarget& UpdateTarget(std::uint32_t index, ConstView state, std::uint32_t type);
+  /// The chain of target `index` (built if needed); null for a target with no segment.
+  const VTgtChainInfo* ChainInfo(std::uint32_t index) { return Chain(index); }
+
   /// The parameters each joint needs to give its segment's current local pose; true only when
   /// every joint could (within `tolerance`). Segments that fail still get their best reading.
   bool StateFromWorldPoses(View o_rState, double tolerance) const;
 
 private:
   void Build();
+  const VComputeSegment* SegmentByIdentifier(std::uint32_t id) const;
+  void BuildChain(std::uint32_t index, VTgtChainInfo& o_rInfo) const;
+  VTgtChainInfo* Chain(std::uint32_t index);
 
   std::shared_ptr<const KinematicAlgo::ISubjectCalibrated> m_pSubject;
   std::uint32_t m_Mode;
   std::uint32_t m_UseRotator;
   std::vector<VComputeSegment> m_Segments;
   std::vector<std::unique_ptr<IComputeTarget>> m_Targets;
+  /// The model's targets as of construction (kept alive), to check a reload against.
+  std::vector<std::shared_ptr<const KinematicAlgo::ITargetCalibrated>> m_ModelTargets;
+  std::map<std::uint32_t, VTgtChainInfo> m_Chains;
   std::uint32_t m_NumJointParams = 0;
   std::uint32_t m_NumTargetParams = 0;
   std::vector<double> m_Cache;

@@ -294,6 +294,110 @@ void VComputeRigidBody::ResidualJacobian(ConstView, JacobianRef o_rJacobian) con
 
 // --- Factory ------------------------------------------------------------------------------
 
+// --- World plane ---------------------------------------------------------------------------
+
+VComputeTargetPlane::VComputeTargetPlane(const VTargetPlane& target, const VComputeSegment* parent)
+    : VComputeTargetSingleParent(target, parent, "VComputeTargetPlane", 3),
+      m_Local(target.PositionInParent()), m_Normal(target.WorldNormal().normalized()),
+      m_Offset(target.WorldOffset()) {
+  m_Values = m_Local;
+}
+
+void VComputeTargetPlane::Update() {
+  if (!m_pParent) return;
+  const VPose& W = m_pParent->WorldPose();
+  m_Values = W.m_Rotation * m_Local + W.m_Translation;
+}
+
+void VComputeTargetPlane::ValueJacobian(JacobianRef o_rJacobian) const {
+  o_rJacobian.setZero();
+  ForEachDerivative([&](Eigen::Index c, const Matrix3r& dR, const Eigen::Vector3d& dT) {
+    o_rJacobian.col(c).head<3>() += dR * m_Local + dT;
+  });
+}
+
+void VComputeTargetPlane::Residual(ConstView, View o_rResidual) const {
+  o_rResidual[0] = m_Normal.dot(m_Values.head<3>()) - m_Offset;
+}
+
+void VComputeTargetPlane::ResidualJacobian(ConstView, JacobianRef o_rJacobian) const {
+  o_rJacobian.setZero();
+  ForEachDerivative([&](Eigen::Index c, const Matrix3r& dR, const Eigen::Vector3d& dT) {
+    o_rJacobian(0, c) += m_Normal.dot(dR * m_Local + dT);
+  });
+}
+
+void VComputeTargetPlane::Rebind(const VComputeSegment* parent) {
+  *this = VComputeTargetPlane(static_cast<const VTargetPlane&>(*m_pTarget), parent);
+}
+
+// --- Relative position ---------------------------------------------------------------------
+
+VComputeTargetRelativePosition::VComputeTargetRelativePosition(
+    const VTargetRelativePosition& target, const VComputeSegment* first,
+    const VComputeSegment* second)
+    : m_pTarget(&target) {
+  Rebind(first, second);
+}
+
+void VComputeTargetRelativePosition::Rebind(const VComputeSegment* first,
+                                            const VComputeSegment* second) {
+  m_Local = {m_pTarget->PositionInParent1(), m_pTarget->PositionInParent2()};
+  m_Parents = {first, second};
+  if (!first || !second) m_Parents = {nullptr, nullptr};
+  m_Errors = m_Parents[0] ? "" : "VComputeTargetRelativePosition cannot find segment. ";
+  m_Values.setZero();
+}
+
+void VComputeTargetRelativePosition::Update() {
+  if (!m_Parents[0]) return;
+  const VPose& A = m_Parents[0]->WorldPose();
+  const VPose& B = m_Parents[1]->WorldPose();
+  m_Values =
+      (A.m_Rotation * m_Local[0] + A.m_Translation) - (B.m_Rotation * m_Local[1] + B.m_Translation);
+}
+
+void VComputeTargetRelativePosition::ValueJacobian(JacobianRef o_rJacobian) const {
+  o_rJacobian.setZero();
+  if (!m_Parents[0]) return;
+  // Blocks of both chains add up where they share ancestors.
+  for (int k = 0; k < 2; ++k) {
+    const double sign = k ? -1.0 : 1.0;
+    const auto& blocks = m_Parents[size_t(k)]->JacobianBlocks();
+    for (std::uint32_t b = 0; b < m_Parents[size_t(k)]->NumJacobianBlocks(); ++b)
+      for (std::uint32_t i = 0; i < blocks[b].m_NumParams; ++i)
+        o_rJacobian.col(Eigen::Index(blocks[b].m_FirstParam + i)).head<3>() +=
+            sign * (blocks[b].m_dR[i] * m_Local[size_t(k)] + blocks[b].m_dT[i]);
+  }
+}
+
+void VComputeTargetRelativePosition::Residual(ConstView observation, View o_rResidual) const {
+  Eigen::Map<Eigen::Vector3d>(o_rResidual.data()) = m_Values - Point(observation);
+}
+
+// Each run-time target re-reads its model target by being built again in place; the model
+// target's class is the one it was made from.
+void VComputeTargetPosition::Rebind(const VComputeSegment* parent) {
+  *this = VComputeTargetPosition(*m_pTarget, parent);
+}
+void VComputeTargetSegmentPlane::Rebind(const VComputeSegment* parent) {
+  *this = VComputeTargetSegmentPlane(static_cast<const VTargetSegmentPlane&>(*m_pTarget), parent);
+}
+void VComputeTargetSegmentRay::Rebind(const VComputeSegment* parent) {
+  *this = VComputeTargetSegmentRay(static_cast<const VTargetSegmentRay&>(*m_pTarget), parent);
+}
+void VComputeTargetDirection::Rebind(const VComputeSegment* parent) {
+  *this = VComputeTargetDirection(static_cast<const VTargetDirection&>(*m_pTarget), parent);
+}
+void VComputeTargetOrientation::Rebind(const VComputeSegment* parent) {
+  *this = VComputeTargetOrientation(static_cast<const VTargetOrientation&>(*m_pTarget), parent);
+}
+void VComputeRigidBody::Rebind(const VComputeSegment* parent) {
+  std::vector<double> weights = std::move(m_Weights);
+  *this = VComputeRigidBody(static_cast<const VTargetRigidBody&>(*m_pTarget), parent);
+  if (weights.size() == m_Weights.size()) m_Weights = std::move(weights);
+}
+
 std::unique_ptr<IComputeTarget> MakeComputeTarget(const ITargetCalibrated& target,
                                                   const VComputeSegment* parent) {
   const char* key = target.Key();
@@ -308,6 +412,8 @@ std::unique_ptr<IComputeTarget> MakeComputeTarget(const ITargetCalibrated& targe
     return std::make_unique<VComputeTargetDirection>(*direction, parent);
   if (const auto* orientation = dynamic_cast<const VTargetOrientation*>(&target))
     return std::make_unique<VComputeTargetOrientation>(*orientation, parent);
+  if (const auto* plane = dynamic_cast<const VTargetPlane*>(&target))
+    return std::make_unique<VComputeTargetPlane>(*plane, parent);
   if (const auto* body = dynamic_cast<const VTargetRigidBody*>(&target))
     return std::make_unique<VComputeRigidBody>(*body, parent);
   return nullptr;

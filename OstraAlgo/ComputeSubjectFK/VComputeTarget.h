@@ -28,6 +28,10 @@ public:
   virtual std::uint32_t NumParams() const = 0;
   /// Recomputes the world quantity from the parent's current pose.
   virtual void Update() = 0;
+  /// Reads the model target's geometry again and binds to `parent` (null: unbound). Settings
+  /// of the run-time target that the model does not hold (member weights) are kept where they
+  /// still apply.
+  virtual void Rebind(const VComputeSegment* parent) = 0;
   /// The message of a failed binding, empty when bound.
   virtual const std::string& Errors() const = 0;
 
@@ -93,6 +97,7 @@ public:
   VComputeTargetPosition(const KinematicAlgo::ITargetCalibrated& target,
                          const VComputeSegment* parent);
   void Update() override;
+  void Rebind(const VComputeSegment* parent) override;
   void ValueJacobian(JacobianRef o_rJacobian) const override { Jacobian(o_rJacobian); }
   std::uint32_t ObservationSize() const override { return 3; }
   std::uint32_t NumResiduals() const override { return 3; }
@@ -121,6 +126,7 @@ public:
   VComputeTargetSegmentPlane(const KinematicAlgo::VTargetSegmentPlane& target,
                              const VComputeSegment* parent);
   void Update() override;
+  void Rebind(const VComputeSegment* parent) override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 3; }
   std::uint32_t NumResiduals() const override { return 1; }
@@ -142,6 +148,7 @@ public:
   VComputeTargetSegmentRay(const KinematicAlgo::VTargetSegmentRay& target,
                            const VComputeSegment* parent);
   void Update() override;
+  void Rebind(const VComputeSegment* parent) override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 3; }
   std::uint32_t NumResiduals() const override { return 2; }
@@ -162,6 +169,7 @@ public:
   VComputeTargetDirection(const KinematicAlgo::VTargetDirection& target,
                           const VComputeSegment* parent);
   void Update() override;
+  void Rebind(const VComputeSegment* parent) override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 3; }
   std::uint32_t NumResiduals() const override { return 3; }
@@ -181,6 +189,7 @@ public:
   VComputeTargetOrientation(const KinematicAlgo::VTargetOrientation& target,
                             const VComputeSegment* parent);
   void Update() override;
+  void Rebind(const VComputeSegment* parent) override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 9; }
   std::uint32_t NumResiduals() const override { return 9; }
@@ -200,6 +209,7 @@ class VComputeRigidBody : public VComputeTargetSingleParent {
 public:
   VComputeRigidBody(const KinematicAlgo::VTargetRigidBody& target, const VComputeSegment* parent);
   void Update() override;
+  void Rebind(const VComputeSegment* parent) override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 3 * NumMembers(); }
   std::uint32_t NumResiduals() const override;
@@ -216,6 +226,58 @@ public:
 private:
   std::vector<Eigen::Vector3d> m_Points;
   std::vector<double> m_Weights;
+};
+
+/// A point fixed in a segment held to a plane fixed in the world. Values: the world position.
+/// Residual (1, no observation): n · x - d, n the plane's unit normal.
+class VComputeTargetPlane : public VComputeTargetSingleParent {
+public:
+  VComputeTargetPlane(const KinematicAlgo::VTargetPlane& target, const VComputeSegment* parent);
+  void Update() override;
+  void Rebind(const VComputeSegment* parent) override;
+  void ValueJacobian(JacobianRef o_rJacobian) const override;
+  std::uint32_t ObservationSize() const override { return 0; }
+  std::uint32_t NumResiduals() const override { return 1; }
+  void Residual(ConstView observation, View o_rResidual) const override;
+  void ResidualJacobian(ConstView observation, JacobianRef o_rJacobian) const override;
+
+private:
+  Eigen::Vector3d m_Local;
+  Eigen::Vector3d m_Normal;
+  double m_Offset;
+};
+
+/// The world offset x1 - x2 between a point fixed in one segment and a point fixed in another.
+/// Values (3): the offset. Residual (3): offset - observed.
+class VComputeTargetRelativePosition : public IComputeTarget {
+public:
+  /// Either parent null leaves the target unbound: "VComputeTargetRelativePosition cannot find
+  /// segment. ", values zero, derivatives zero.
+  VComputeTargetRelativePosition(const KinematicAlgo::VTargetRelativePosition& target,
+                                 const VComputeSegment* first, const VComputeSegment* second);
+  const KinematicAlgo::ITargetCalibrated& Target() const override { return *m_pTarget; }
+  std::uint32_t NumParams() const override { return 0; }
+  void Update() override;
+  /// Rebinding to one parent is not enough for this target: it becomes unbound.
+  void Rebind(const VComputeSegment*) override { Rebind(nullptr, nullptr); }
+  void Rebind(const VComputeSegment* first, const VComputeSegment* second);
+  const std::string& Errors() const override { return m_Errors; }
+  std::uint32_t NumValues() const override { return 3; }
+  ConstView Values() const override { return {m_Values.data(), 3}; }
+  void ValueJacobian(JacobianRef o_rJacobian) const override;
+  std::uint32_t ObservationSize() const override { return 3; }
+  std::uint32_t NumResiduals() const override { return 3; }
+  void Residual(ConstView observation, View o_rResidual) const override;
+  void ResidualJacobian(ConstView observation, JacobianRef o_rJacobian) const override {
+    ValueJacobian(o_rJacobian);
+  }
+
+private:
+  const KinematicAlgo::VTargetRelativePosition* m_pTarget;
+  std::array<const VComputeSegment*, 2> m_Parents;
+  std::array<Eigen::Vector3d, 2> m_Local;
+  Eigen::Vector3d m_Values = Eigen::Vector3d::Zero();
+  std::string m_Errors;
 };
 
 /// The run-time target of a model target, bound to `parent` (null when its segment is not in

@@ -10,11 +10,14 @@
 
 #include <array>
 #include <cstdint>
+#include <iosfwd>
 #include <memory>
 #include <string>
 #include <vector>
 
 namespace KinematicAlgo {
+
+class VTextReader;
 
 class IJointCalibrated {
 public:
@@ -47,6 +50,10 @@ public:
   virtual std::shared_ptr<IJointCalibrated> Clone() const = 0;
   /// Every field exactly.
   virtual bool Equals(const IJointCalibrated& other) const = 0;
+  /// The line-oriented text form (see CalibratedText.h) and its reading; a failed read leaves
+  /// the reader's error set and this object in an unspecified but valid state.
+  virtual void Write(std::ostream& o_rStream) const = 0;
+  virtual bool Read(VTextReader& io_rReader) = 0;
 };
 
 class ISegmentCalibrated {
@@ -70,6 +77,9 @@ public:
   virtual void SetBoundingBox(const std::array<double, 6>& box) = 0;
   virtual std::shared_ptr<ISegmentCalibrated> Clone() const = 0;
   virtual bool Equals(const ISegmentCalibrated& other) const = 0;
+  /// The segment's fields, then its joint's.
+  virtual void Write(std::ostream& o_rStream) const = 0;
+  virtual bool Read(VTextReader& io_rReader) = 0;
 };
 
 class ITargetCalibrated {
@@ -85,6 +95,9 @@ public:
   virtual void SetIdentifier(std::int32_t id) = 0;
   virtual const std::string& Name() const = 0;
   virtual void SetName(const std::string& name) = 0;
+  /// The target's fields without its key (the subject writes the key before it).
+  virtual void Write(std::ostream& o_rStream) const = 0;
+  virtual bool Read(VTextReader& io_rReader) = 0;
 };
 
 /// A target fixed to one segment.
@@ -108,6 +121,14 @@ public:
 
 using SegmentTree = VTree<std::shared_ptr<ISegmentCalibrated>>;
 
+/// A line drawn between two markers (indices into the marker list), with its colour.
+struct VStick {
+  std::uint32_t m_Marker1 = 0;
+  std::uint32_t m_Marker2 = 0;
+  std::array<std::uint8_t, 3> m_Colour{};
+  bool operator==(const VStick&) const = default;
+};
+
 class ISubjectCalibrated {
 public:
   virtual ~ISubjectCalibrated() = default;
@@ -122,8 +143,16 @@ public:
   virtual std::uint32_t NumMarkers() const = 0;
   /// A marker is a target too; it may be the same object as one of Target(i).
   virtual std::shared_ptr<ITargetCalibrated> Marker(std::uint32_t i) const = 0;
+  virtual const std::vector<VStick>& Sticks() const = 0;
+  virtual void SetSticks(const std::vector<VStick>& sticks) = 0;
   virtual std::shared_ptr<ISubjectCalibrated> Clone() const = 0;
+  /// Name, identifier, tree shape and segments, targets, markers and sticks, all exactly.
   virtual bool Equals(const ISubjectCalibrated& other) const = 0;
+  /// The whole subject as text (see CalibratedText.h).
+  virtual void Write(std::ostream& o_rStream) const = 0;
+  /// Reads a subject written by Write from the rest of the stream. On failure returns false,
+  /// puts the reason (with its line) into `o_pError` and leaves this subject as it was.
+  virtual bool Read(std::istream& io_rStream, std::string* o_pError = nullptr) = 0;
 };
 
 } // namespace KinematicAlgo

@@ -104,7 +104,8 @@ VSubjectCalibrated::VSubjectCalibrated() {
 }
 
 VSubjectCalibrated::VSubjectCalibrated(const VSubjectCalibrated& other)
-    : m_Tree(other.m_Tree), m_Name(other.m_Name), m_Identifier(other.m_Identifier) {
+    : m_Tree(other.m_Tree), m_Sticks(other.m_Sticks), m_Name(other.m_Name),
+      m_Identifier(other.m_Identifier) {
   for (std::int32_t i = 0; i < m_Tree.Size(); ++i)
     m_Tree[i].m_Value = m_Tree[i].m_Value->Clone();
   for (const auto& target : other.m_Targets)
@@ -112,7 +113,7 @@ VSubjectCalibrated::VSubjectCalibrated(const VSubjectCalibrated& other)
   for (const auto& marker : other.m_Markers) {
     std::shared_ptr<ITargetCalibrated> copy;
     for (size_t t = 0; t < other.m_Targets.size() && !copy; ++t)
-      if (other.m_Targets[t]->Identifier() == marker->Identifier()) copy = m_Targets[t];
+      if (other.m_Targets[t] == marker) copy = m_Targets[t];
     m_Markers.push_back(copy ? copy : marker->Clone());
   }
 }
@@ -133,7 +134,9 @@ bool VSubjectCalibrated::Equals(const ISubjectCalibrated& o) const {
       return false;
   for (std::uint32_t t = 0; t < NumTargets(); ++t)
     if (!m_Targets[t]->Equals(*o.Target(t))) return false;
-  return true;
+  for (std::uint32_t m = 0; m < NumMarkers(); ++m)
+    if (!m_Markers[m]->Equals(*o.Marker(m))) return false;
+  return m_Sticks == o.Sticks();
 }
 
 } // namespace KinematicAlgo

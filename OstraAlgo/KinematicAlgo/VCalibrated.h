@@ -5,6 +5,7 @@
 
 #include <functional>
 #include <map>
+#include <string_view>
 
 namespace KinematicAlgo {
 
@@ -34,6 +35,8 @@ public:
     return std::make_shared<VJointCalibrated>(*this);
   }
   bool Equals(const IJointCalibrated& other) const override;
+  void Write(std::ostream& o_rStream) const override;
+  bool Read(VTextReader& io_rReader) override;
 
 private:
   std::string m_Name = "DefaultName";
@@ -67,6 +70,8 @@ public:
   /// Deep: the joint is cloned too.
   std::shared_ptr<ISegmentCalibrated> Clone() const override;
   bool Equals(const ISegmentCalibrated& other) const override;
+  void Write(std::ostream& o_rStream) const override;
+  bool Read(VTextReader& io_rReader) override;
 
 private:
   std::string m_Name;
@@ -94,6 +99,8 @@ public:
   void SetParentIdentifier(std::uint32_t id) override { m_Parent = id; }
   const Eigen::Vector3d& PositionInParent() const override { return m_Position; }
   void SetPositionInParent(const Eigen::Vector3d& p) override { m_Position = p; }
+  void Write(std::ostream& o_rStream) const override;
+  bool Read(VTextReader& io_rReader) override;
 
 private:
   std::string m_Name;
@@ -113,6 +120,8 @@ public:
   const char* Key() const override { return "TargetPositionWithCovariance"; }
   const Eigen::Matrix3d& Covariance() const override { return m_Covariance; }
   void SetCovariance(const Eigen::Matrix3d& c) override { m_Covariance = c; }
+  void Write(std::ostream& o_rStream) const override;
+  bool Read(VTextReader& io_rReader) override;
 
 private:
   Eigen::Matrix3d m_Covariance = Eigen::Matrix3d::Zero();
@@ -139,8 +148,9 @@ class VSubjectCalibrated : public ISubjectCalibrated {
 public:
   /// One root segment with a default joint.
   VSubjectCalibrated();
-  /// Deep copy: segments and targets are cloned; a marker that is also a target (same
-  /// identifier) shares the copied target.
+  /// Deep copy: segments and targets are cloned; a marker that is also a target (the same
+  /// object; identifiers are often left at -1 and would pair the wrong ones) shares the copied
+  /// target.
   VSubjectCalibrated(const VSubjectCalibrated& other);
   VSubjectCalibrated& operator=(const VSubjectCalibrated&) = delete;
 
@@ -154,19 +164,31 @@ public:
   std::shared_ptr<ITargetCalibrated> Target(std::uint32_t i) const override { return m_Targets[i]; }
   std::uint32_t NumMarkers() const override { return std::uint32_t(m_Markers.size()); }
   std::shared_ptr<ITargetCalibrated> Marker(std::uint32_t i) const override { return m_Markers[i]; }
+  const std::vector<VStick>& Sticks() const override { return m_Sticks; }
+  void SetSticks(const std::vector<VStick>& sticks) override { m_Sticks = sticks; }
   std::shared_ptr<ISubjectCalibrated> Clone() const override {
     return std::make_shared<VSubjectCalibrated>(*this);
   }
   bool Equals(const ISubjectCalibrated& other) const override;
+  void Write(std::ostream& o_rStream) const override;
+  bool Read(std::istream& io_rStream, std::string* o_pError = nullptr) override;
+  /// Reads from text in memory; as Read otherwise.
+  bool ReadText(std::string_view text, std::string* o_pError = nullptr);
+  /// Reads one subject from `io_rReader`, leaving the reader after it (for files that hold more
+  /// than a subject). False with the reader's error set, and this subject unchanged, on failure.
+  bool ReadFrom(VTextReader& io_rReader);
 
   /// Replaces the tree by an empty one.
   void ClearSegments() { m_Tree = SegmentTree(); }
   void AddTarget(std::shared_ptr<ITargetCalibrated> target, bool isMarker);
+  /// A marker that is not among the targets.
+  void AddMarker(std::shared_ptr<ITargetCalibrated> marker) { m_Markers.push_back(marker); }
 
 private:
   SegmentTree m_Tree;
   std::vector<std::shared_ptr<ITargetCalibrated>> m_Targets;
   std::vector<std::shared_ptr<ITargetCalibrated>> m_Markers;
+  std::vector<VStick> m_Sticks;
   std::string m_Name;
   std::int32_t m_Identifier = -1;
 };

@@ -38,6 +38,18 @@ bool VTargetRigidBody::Equals(const ITargetCalibrated& o) const {
   return true;
 }
 
+bool VTargetPlane::Equals(const ITargetCalibrated& o) const {
+  const auto* other = dynamic_cast<const VTargetPlane*>(&o);
+  return other && VTargetPosition::Equals(o) && m_Normal == other->m_Normal &&
+         m_Offset == other->m_Offset;
+}
+
+bool VTargetRelativePosition::Equals(const ITargetCalibrated& o) const {
+  const auto* other = dynamic_cast<const VTargetRelativePosition*>(&o);
+  return other && m_Name == other->m_Name && m_Parents == other->m_Parents &&
+         m_Positions[0] == other->m_Positions[0] && m_Positions[1] == other->m_Positions[1];
+}
+
 void RegisterModelTargets(VTargetFactory& f) {
   f.Register("TargetPosition", [] { return std::make_shared<VTargetPosition>(); });
   f.Register("TargetOrientation", [] { return std::make_shared<VTargetOrientation>(); });
@@ -47,6 +59,8 @@ void RegisterModelTargets(VTargetFactory& f) {
   f.Register("TargetSegmentPlane", [] { return std::make_shared<VTargetSegmentPlane>(); });
   f.Register("TargetRigidBody", [] { return std::make_shared<VTargetRigidBody>(); });
   f.Register("TargetDirection", [] { return std::make_shared<VTargetDirection>(); });
+  f.Register("TargetPlane", [] { return std::make_shared<VTargetPlane>(); });
+  f.Register("TargetRelativePosition", [] { return std::make_shared<VTargetRelativePosition>(); });
 }
 
 } // namespace KinematicAlgo

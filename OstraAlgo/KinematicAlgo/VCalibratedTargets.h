@@ -36,6 +36,13 @@ public:
   void SetDirectionInParent(const Eigen::Vector3d& d) override { m_Direction = d; }
   const Eigen::MatrixXd& ResidualCovariance() const override { return m_ResidualCovariance; }
   void SetResidualCovariance(const Eigen::MatrixXd& c) override { m_ResidualCovariance = c; }
+  /// The point, then the direction under the label of the class, then the residual covariance.
+  void Write(std::ostream& o_rStream) const override;
+  bool Read(VTextReader& io_rReader) override;
+
+protected:
+  /// "NormalInParent: " for the plane, "DirInParent: " for the others.
+  virtual const char* DirectionLabel() const { return "DirInParent: "; }
 
 private:
   Eigen::Vector3d m_Direction = Eigen::Vector3d::UnitZ();
@@ -51,6 +58,9 @@ public:
     return std::make_shared<VTargetSegmentPlane>(*this);
   }
   const char* Key() const override { return "TargetSegmentPlane"; }
+
+protected:
+  const char* DirectionLabel() const override { return "NormalInParent: "; }
 };
 
 /// A ray from PositionInParent() along DirectionInParent(): "TargetSegmentRay". Its residual is
@@ -86,6 +96,8 @@ public:
   const char* Key() const override { return "TargetOrientation"; }
   const Eigen::Matrix3d& OrientationInParent() const { return m_Orientation; }
   void SetOrientationInParent(const Eigen::Matrix3d& r) { m_Orientation = r; }
+  void Write(std::ostream& o_rStream) const override;
+  bool Read(VTextReader& io_rReader) override;
 
 private:
   Eigen::Matrix3d m_Orientation = Eigen::Matrix3d::Identity();
@@ -108,10 +120,83 @@ public:
   const VTargetPosition& Member(std::uint32_t i) const { return *m_Members[i]; }
   std::shared_ptr<VTargetPosition> MemberPtr(std::uint32_t i) const { return m_Members[i]; }
   void AddMember(std::shared_ptr<VTargetPosition> member) { m_Members.push_back(member); }
+  /// Its own header (group name, identifier, parent, body pose), then the members.
+  void Write(std::ostream& o_rStream) const override;
+  bool Read(VTextReader& io_rReader) override;
 
 private:
   VPose m_Body;
   std::vector<std::shared_ptr<VTargetPosition>> m_Members;
+};
+
+/// A point fixed in its segment that should lie on a plane fixed in the world: "TargetPlane".
+/// The plane is the points x with n · x = d (n as given, normalised by the run-time target).
+class VTargetPlane : public VTargetPosition {
+public:
+  using VTargetPosition::VTargetPosition;
+  std::shared_ptr<ITargetCalibrated> Clone() const override {
+    return std::make_shared<VTargetPlane>(*this);
+  }
+  bool Equals(const ITargetCalibrated& other) const override;
+  const char* Key() const override { return "TargetPlane"; }
+  const Eigen::Vector3d& WorldNormal() const { return m_Normal; }
+  double WorldOffset() const { return m_Offset; }
+  void SetWorldPlane(const Eigen::Vector3d& normal, double offset) {
+    m_Normal = normal;
+    m_Offset = offset;
+  }
+  void Write(std::ostream& o_rStream) const override;
+  bool Read(VTextReader& io_rReader) override;
+
+private:
+  Eigen::Vector3d m_Normal = Eigen::Vector3d::UnitZ();
+  double m_Offset = 0.0;
+};
+
+/// A target between two segments.
+class ITargetTwoParents {
+public:
+  virtual ~ITargetTwoParents() = default;
+  virtual std::uint32_t ParentIdentifier1() const = 0;
+  virtual std::uint32_t ParentIdentifier2() const = 0;
+  virtual void SetParentIdentifiers(std::uint32_t first, std::uint32_t second) = 0;
+  virtual const Eigen::Vector3d& PositionInParent1() const = 0;
+  virtual const Eigen::Vector3d& PositionInParent2() const = 0;
+  virtual void SetPositionsInParents(const Eigen::Vector3d& first,
+                                     const Eigen::Vector3d& second) = 0;
+};
+
+/// The offset between a point fixed in one segment and a point fixed in another:
+/// "TargetRelativePosition".
+class VTargetRelativePosition : public ITargetCalibrated, public ITargetTwoParents {
+public:
+  std::shared_ptr<ITargetCalibrated> Clone() const override {
+    return std::make_shared<VTargetRelativePosition>(*this);
+  }
+  bool Equals(const ITargetCalibrated& other) const override;
+  const char* Key() const override { return "TargetRelativePosition"; }
+  std::int32_t Identifier() const override { return m_Identifier; }
+  void SetIdentifier(std::int32_t id) override { m_Identifier = id; }
+  const std::string& Name() const override { return m_Name; }
+  void SetName(const std::string& name) override { m_Name = name; }
+  std::uint32_t ParentIdentifier1() const override { return m_Parents[0]; }
+  std::uint32_t ParentIdentifier2() const override { return m_Parents[1]; }
+  void SetParentIdentifiers(std::uint32_t first, std::uint32_t second) override {
+    m_Parents = {first, second};
+  }
+  const Eigen::Vector3d& PositionInParent1() const override { return m_Positions[0]; }
+  const Eigen::Vector3d& PositionInParent2() const override { return m_Positions[1]; }
+  void SetPositionsInParents(const Eigen::Vector3d& first, const Eigen::Vector3d& second) override {
+    m_Positions = {first, second};
+  }
+  void Write(std::ostream& o_rStream) const override;
+  bool Read(VTextReader& io_rReader) override;
+
+private:
+  std::string m_Name;
+  std::int32_t m_Identifier = -1;
+  std::array<std::uint32_t, 2> m_Parents{};
+  std::array<Eigen::Vector3d, 2> m_Positions{Eigen::Vector3d::Zero(), Eigen::Vector3d::Zero()};
 };
 
 /// Registers every model target class with `factory`, in a fixed order (the order gives Type()).
