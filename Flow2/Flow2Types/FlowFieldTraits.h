@@ -69,6 +69,14 @@ template <class T> constexpr ISchema::EType ScalarType() {
   }
 }
 
+/// Numbers (not bools) and fixed arrays of them: their bytes in memory are their bytes in a file,
+/// so a run of them is written in one piece.
+template <class T>
+struct PackedNumbers : std::bool_constant<std::is_arithmetic_v<T> && !std::is_same_v<T, bool>> {};
+template <class T, std::size_t N>
+struct PackedNumbers<std::array<T, N>>
+    : std::bool_constant<PackedNumbers<T>::value && sizeof(std::array<T, N>) == sizeof(T) * N> {};
+
 inline bool WriteCount(IOutputStream& s, std::size_t count) {
   if (count > 0xFFFFFFFFu) return false;
   const std::uint32_t n = static_cast<std::uint32_t>(count);
@@ -143,6 +151,8 @@ template <class T, std::size_t N> struct TFlowField<std::array<T, N>> {
     TFlowField<T>::Schema(o_rSchema.m_Members[0].m_Schema, docs);
   }
   static bool Write(IOutputStream& s, const std::array<T, N>& v) {
+    // Numbers other than bool are stored as they lie in memory: one write for the whole array.
+    if constexpr (Detail::PackedNumbers<T>::value) return s.Write(v.data(), sizeof(T) * N);
     for (const T& e : v)
       if (!TFlowField<T>::Write(s, e)) return false;
     return true;
@@ -168,6 +178,8 @@ template <class T> struct TFlowField<std::vector<T>> {
   }
   static bool Write(IOutputStream& s, const std::vector<T>& v) {
     if (!Detail::WriteCount(s, v.size())) return false;
+    if constexpr (Detail::PackedNumbers<T>::value)
+      return v.empty() || s.Write(v.data(), sizeof(T) * v.size());
     for (const T& e : v)
       if (!TFlowField<T>::Write(s, e)) return false;
     return true;
