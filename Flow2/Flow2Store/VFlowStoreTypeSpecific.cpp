@@ -18,7 +18,13 @@ VFlowStoreTypeSpecific::VFlowStoreTypeSpecific(std::shared_ptr<ZMT::IFlowItemFac
 VFlowStoreEntry* VFlowStoreTypeSpecific::TakeEntry() {
   VFlowStoreEntry* pEntry = FreePopFront();
   if (pEntry) {
-    if (m_ReuseCountdown != 0) {
+    // Now and then a recycled item that last held much is rebuilt, so that one that grew large
+    // containers doesn't stay large for ever; items of an everyday size keep their capacity.
+    const bool rebuild =
+        m_ReuseCountdown == 0 && pEntry->m_pItem && pEntry->m_pItem->GetSize() > RebuildAboveBytes;
+    if (m_ReuseCountdown == 0)
+      m_ReuseCountdown = static_cast<std::uint32_t>(m_CreatedCount & 31) + ReuseCountdownBase;
+    if (!rebuild) {
       pEntry->DropBytes();
       if (pEntry->m_pItem && !pEntry->m_pItem->Clear()) {
         delete pEntry->m_pItem;
@@ -26,9 +32,6 @@ VFlowStoreEntry* VFlowStoreTypeSpecific::TakeEntry() {
       }
       --m_ReuseCountdown;
     } else {
-      // Now and then a recycled item is rebuilt, so that one that grew large containers doesn't
-      // stay large for ever.
-      m_ReuseCountdown = static_cast<std::uint32_t>(m_CreatedCount & 31) + ReuseCountdownBase;
       delete pEntry->m_pItem;
       pEntry->m_pItem = nullptr;
       pEntry->DropBytes();

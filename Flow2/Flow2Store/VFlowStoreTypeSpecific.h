@@ -13,6 +13,8 @@ public:
   /// Reuses between two deliberate rebuilds of a recycled item: Base plus the created count's low
   /// five bits.
   static constexpr std::uint32_t ReuseCountdownBase = 400;
+  /// A recycled item is rebuilt at the end of its countdown only when its last content was larger.
+  static constexpr std::uint64_t RebuildAboveBytes = 64 * 1024;
 
   VFlowStoreTypeSpecific(std::shared_ptr<ZMT::IFlowItemFactory> i_pFactory,
                          ZMT::IFlowStore* i_pOwner, std::uint64_t flowStoreId);

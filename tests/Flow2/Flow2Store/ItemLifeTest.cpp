@@ -87,16 +87,24 @@ TEST_F(FlowItemLife, TheFreeListDropsItsTwoOldestPastOneHundred) {
   EXPECT_EQ(FreeCount(101), 100u);
 }
 
-TEST_F(FlowItemLife, ARecycledItemIsRebuiltAfterHundredsOfReuses) {
+TEST_F(FlowItemLife, ARecycledItemIsRebuiltOnlyWhenItLastHeldMuch) {
   std::uint64_t live = 0, created = 0;
-  for (int i = 0; i < 401; ++i)
-    Create<VFlowTestMixed>(); // 1 creation, 400 reuses
+  for (int i = 0; i < 402; ++i) {
+    IFlowItemHandle item = Create<VFlowTestMixed>(); // 1 creation, 401 reuses
+    item.As<MixedItem>()->m_Ids.assign(100, 7u);
+  }
   Counts(TypeOf<VFlowTestMixed>(), live, created);
-  EXPECT_EQ(created, 1u);
-  IFlowItemHandle item = Create<VFlowTestMixed>(); // countdown ran out: a new item
+  EXPECT_EQ(created, 1u); // a small item keeps its slot past the countdown
+
+  // One that last held more than 64 KiB is rebuilt when its next countdown runs out.
+  for (int i = 0; i < 440; ++i) {
+    IFlowItemHandle item = Create<VFlowTestMixed>();
+    item.As<MixedItem>()->m_Ids.assign(20000, 7u);
+  }
   Counts(TypeOf<VFlowTestMixed>(), live, created);
   EXPECT_EQ(created, 2u);
-  EXPECT_EQ(item.GetToken().m_ItemId, 402u);
+  IFlowItemHandle item = Create<VFlowTestMixed>();
+  EXPECT_TRUE(item.As<MixedItem>()->m_Ids.empty());
 }
 
 TEST_F(FlowItemLife, CountedCreateReleasesWhatTheVectorHeld) {
