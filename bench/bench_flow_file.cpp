@@ -7,6 +7,7 @@
 // and filling the items, which belongs to the caller, isn't counted.
 
 #include "AllocationCounter.h"
+#include "FlowBenchMarker.h"
 #include "RatioReporter.h"
 
 #include "Flow2/Flow2File/VReader.h"
@@ -31,25 +32,9 @@ constexpr int States = 36000;
 constexpr int Markers = 200;
 constexpr std::int64_t Period = 135000000 / 120;
 
-struct VMarker {
-  static constexpr const char* FlowClassName = "BenchMarker";
-  double m_X = 0, m_Y = 0, m_Z = 0;
-  float m_Residual = 0;
-  std::uint32_t m_Flags = 0;
-  template <class S, class V> static void FlowFields(S& s, V&& v) {
-    v("X", "", s.m_X);
-    v("Y", "", s.m_Y);
-    v("Z", "", s.m_Z);
-    v("Residual", "", s.m_Residual);
-    v("Flags", "", s.m_Flags);
-  }
-};
-struct VFlowBenchMarker : VMarker {
-  static constexpr const char* FlowTypeName = "FlowBenchMarker";
-  static constexpr std::uint32_t FlowTypeId = 1;
-  static constexpr ZMT::IFlowItemVersion FlowVersion{1, 0, 0};
-};
-using MarkerItem = ZMT::Detail::VFlowItem<VFlowBenchMarker>;
+using Bench::MarkerItem;
+using Bench::VFlowBenchMarker;
+using Bench::VMarker;
 
 void Check(bool ok, const char* what) {
   if (!ok) {

@@ -9,6 +9,7 @@
 #include "Flow2/Flow2Types/IFlowState.h"
 #include "Flow2/Flow2Types/VFlowItem.h"
 
+#include "FlowBenchMarker.h"
 #include "RatioReporter.h"
 #include <benchmark/benchmark.h>
 
@@ -82,24 +83,9 @@ constexpr int Poses = 5;
 constexpr int StreamFrames = 10000;
 constexpr std::int64_t TicksPerFrame = 135000000 / 120;
 
-struct VMarker {
-  static constexpr const char* FlowClassName = "BenchMarker";
-  double m_X = 0, m_Y = 0, m_Z = 0;
-  float m_Residual = 0;
-  std::uint32_t m_Flags = 0;
-  template <class S, class V> static void FlowFields(S& s, V&& v) {
-    v("X", "", s.m_X);
-    v("Y", "", s.m_Y);
-    v("Z", "", s.m_Z);
-    v("Residual", "", s.m_Residual);
-    v("Flags", "", s.m_Flags);
-  }
-};
-struct VFlowBenchMarker : VMarker {
-  static constexpr const char* FlowTypeName = "FlowBenchMarker";
-  static constexpr std::uint32_t FlowTypeId = 1;
-  static constexpr ZMT::IFlowItemVersion FlowVersion{1, 0, 0};
-};
+using Bench::MarkerItem;
+using Bench::VFlowBenchMarker;
+using Bench::VMarker;
 
 struct VQuality {
   static constexpr const char* FlowClassName = "BenchQuality";
@@ -133,7 +119,6 @@ struct VFlowBenchPose : VPose {
   static constexpr ZMT::IFlowItemVersion FlowVersion{1, 0, 0};
 };
 
-using MarkerItem = ZMT::Detail::VFlowItem<VFlowBenchMarker>;
 using QualityItem = ZMT::Detail::VFlowItem<VFlowBenchQuality>;
 using PoseItem = ZMT::Detail::VFlowItem<VFlowBenchPose>;
 
