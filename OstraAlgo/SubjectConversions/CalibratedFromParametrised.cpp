@@ -16,33 +16,6 @@ using namespace KinematicAlgo;
 
 #define CONVERSION_LOG(level, ...) ZMT_LOG(SubjectConversionChannel, level, __VA_ARGS__)
 
-namespace {
-
-/// The first target's state entry where `marker`'s position starts, as the forward conversion
-/// places it; false when no target places it.
-bool FirstPlace(const VSubjectParametrised& subject, std::uint32_t marker, std::size_t& o_rTarget,
-                std::size_t& o_rFirst) {
-  for (std::size_t t = 0; t < subject.m_Targets.size(); ++t) {
-    const auto& target = subject.m_Targets[t];
-    for (std::size_t k = 0; k < target.m_MarkerIndices.size(); ++k) {
-      if (target.m_MarkerIndices[k] != marker) continue;
-      std::size_t first = SIZE_MAX;
-      if (target.m_Type == VSubjectParametrised::VTarget::ERigidBody)
-        first = 6 + 3 * k;
-      else if (target.m_MarkerIndices.size() == 1)
-        first = 0;
-      if (first != SIZE_MAX && first + 3 <= target.m_StateExpressions.size()) {
-        o_rTarget = t;
-        o_rFirst = first;
-        return true;
-      }
-    }
-  }
-  return false;
-}
-
-} // namespace
-
 std::shared_ptr<VSubjectCalibrated> CalibratedFromParametrised(const VSubjectParametrised& subject,
                                                                VSkeletonParameters& o_rParameters) {
   CoreOstraTypes::VSubject solved;
@@ -94,8 +67,9 @@ std::shared_ptr<VSubjectCalibrated> CalibratedFromParametrised(const VSubjectPar
     parameters.SegmentLinks().push_back(std::move(link));
   }
   for (std::uint32_t m = 0; m < subject.m_Markers.size(); ++m) {
-    std::size_t t = 0, first = 0;
-    if (!FirstPlace(subject, m, t, first)) continue;
+    const auto places = MarkerPlaces(subject, m);
+    if (places.empty()) continue;
+    const auto [t, first] = places.front();
     const auto begin = subject.m_Targets[t].m_StateExpressions.begin() + std::ptrdiff_t(first);
     if (!namesParameter(begin, begin + 3)) continue;
     VMarkerParameterLink link;

@@ -113,24 +113,6 @@ std::string Join(const std::vector<std::string>& names) {
   return out;
 }
 
-/// Where a marker's position sits in the state of each target that places it.
-std::vector<std::pair<std::size_t, std::size_t>> MarkerPlaces(const VSubjectParametrised& subject,
-                                                              std::uint32_t marker) {
-  std::vector<std::pair<std::size_t, std::size_t>> places; // target, first state entry
-  for (std::size_t t = 0; t < subject.m_Targets.size(); ++t) {
-    const auto& target = subject.m_Targets[t];
-    for (std::size_t k = 0; k < target.m_MarkerIndices.size(); ++k) {
-      if (target.m_MarkerIndices[k] != marker) continue;
-      const std::size_t first = target.m_Type == VSubjectParametrised::VTarget::ERigidBody
-                                    ? 6 + 3 * k
-                                    : (target.m_MarkerIndices.size() == 1 ? 0 : SIZE_MAX);
-      if (first != SIZE_MAX && first + 3 <= target.m_StateExpressions.size())
-        places.emplace_back(t, first);
-    }
-  }
-  return places;
-}
-
 /// Ties the lifted record to the links; false (reasons logged) when they don't fit.
 class VLinker {
 public:

@@ -96,4 +96,20 @@ bool NamesParameter(CoreOstraTypesUtils::VDynamicExpressionParserSimple& parser,
   return !node.m_Parameters.empty() || !node.m_Constants.empty();
 }
 
+std::vector<std::pair<std::size_t, std::size_t>> MarkerPlaces(const VSubjectParametrised& subject,
+                                                              std::uint32_t marker) {
+  std::vector<std::pair<std::size_t, std::size_t>> places;
+  for (std::size_t t = 0; t < subject.m_Targets.size(); ++t) {
+    const auto& target = subject.m_Targets[t];
+    for (std::size_t k = 0; k < target.m_MarkerIndices.size(); ++k) {
+      if (target.m_MarkerIndices[k] != marker) continue;
+      const bool body = target.m_Type == VSubjectParametrised::VTarget::ERigidBody;
+      if (!body && target.m_MarkerIndices.size() != 1) continue;
+      const std::size_t first = body ? 6 + 3 * k : 0;
+      if (first + 3 <= target.m_StateExpressions.size()) places.emplace_back(t, first);
+    }
+  }
+  return places;
+}
+
 } // namespace SubjectConversions

@@ -8,7 +8,10 @@
 #include "River/CoreOstraTypes/VSubjectParametrised.h"
 #include "River/CoreOstraTypesUtils/ExpressionParsers.h"
 
+#include <cstddef>
+#include <cstdint>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace SubjectConversions {
@@ -32,5 +35,11 @@ SkeletonParametersFromRecord(const CoreOstraTypes::VSubjectParametrised& subject
 /// unparsable text names none.
 bool NamesParameter(CoreOstraTypesUtils::VDynamicExpressionParserSimple& parser,
                     const std::string& text);
+
+/// Where `marker`'s position sits in the targets that place it, as (target, first of its three
+/// state entries): the origin of a single-marker target (point, plane, ray), a rigid body's
+/// member at 6 + 3i. Targets in order.
+std::vector<std::pair<std::size_t, std::size_t>>
+MarkerPlaces(const CoreOstraTypes::VSubjectParametrised& subject, std::uint32_t marker);
 
 } // namespace SubjectConversions

@@ -56,7 +56,7 @@ VFixture MakeFixture() {
   f.m_Model = SubjectCalibratedFromRecord(solved, errors, notes);
   EXPECT_NE(f.m_Model, nullptr);
 
-  // The shank's pose in itself: the inverse of a quarter of a rotation about Y then (1, 2, 3).
+  // The shank's pose in itself: the inverse of a rotation of 0.3 about Y, then (1, 2, 3).
   const Eigen::Matrix3d r = Eigen::AngleAxisd(0.3, Eigen::Vector3d::UnitY()).toRotationMatrix();
   const Eigen::Vector3d t = -(r.transpose() * Eigen::Vector3d(1, 2, 3));
   f.m_Parameters.SetName("Walker");
@@ -245,4 +245,14 @@ TEST(ParametrisedFromCalibrated, CalibratedToParametrisedAndBackKeepsModelAndPar
   EXPECT_EQ(again.m_DynamicParameters, subject.m_DynamicParameters);
   for (std::size_t i = 0; i < again.m_Segments.size(); ++i)
     EXPECT_EQ(again.m_Segments[i].m_PreTranslation, subject.m_Segments[i].m_PreTranslation);
+
+  // A record that does not evaluate has no model, and the parameters given stay as they were.
+  VSubjectParametrised broken = subject;
+  broken.m_Segments[1].m_PreTranslation[0] = "HipWidth/";
+  VSkeletonParameters kept = back;
+  ZMT::VLogCapture capture(ZMT::ELogError);
+  EXPECT_EQ(CalibratedFromParametrised(broken, kept), nullptr);
+  EXPECT_TRUE(kept.Equals(back));
+  EXPECT_THAT(capture.Messages(SubjectConversionChannel),
+              ElementsAre("Cannot evaluate subject Walker for its calibrated model"));
 }
