@@ -40,7 +40,10 @@ inline std::vector<Marker*>& longTake(const LongTakeShape& i_rShape = LongTakeSh
     g_db->addToScene(pSubject, false, nullptr, false, false);
   }
   for (int m = 0; m < kMarkers; ++m) {
-    auto* pMarker = new Marker(HString(i_rShape.markerPrefix + std::to_string(m)));
+    // Built by appending: GCC 12 warns falsely (-Wrestrict) on a prefix + std::to_string here.
+    std::string name = i_rShape.markerPrefix;
+    name += std::to_string(m);
+    auto* pMarker = new Marker(HString(name));
     pMarker->m_track.reserve(kFrames);
     for (int f = 0; f < kFrames; ++f) {
       if (i_rShape.gaps && (f + 37 * m) % 500 <= 3) continue;
