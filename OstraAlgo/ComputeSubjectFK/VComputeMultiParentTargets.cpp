@@ -135,7 +135,8 @@ void VComputeTargetRelativeRay::Rebind(const SegmentLookup& lookup) {
   const auto& target = static_cast<const VTargetRelativeRay&>(*m_pTarget);
   m_Ids = {target.ParentIdentifier1(), target.ParentIdentifier2()};
   m_Local = {target.PositionInParent1(), target.PositionInParent2()};
-  m_Direction = target.DirectionInParent().normalized();
+  m_ModelDirection = target.DirectionInParent();
+  m_Direction = m_ModelDirection.normalized();
   m_Across = AcrossRows(m_Direction);
   Bind({lookup(m_Ids[0]), lookup(m_Ids[1])}, [](size_t k) {
     return k ? "VComputeTargetRelativeRay cannot find segment 2. "
@@ -191,7 +192,7 @@ bool VComputeTargetRelativeRay::WriteToModel(ITargetCalibrated& o_rTarget) const
   if (!target || !SameKey(o_rTarget, *m_pTarget)) return false;
   target->SetParentIdentifiers(m_Ids[0], m_Ids[1]);
   target->SetPositionsInParents(m_Local[0], m_Local[1]);
-  target->SetDirectionInParent(m_Direction);
+  target->SetDirectionInParent(m_ModelDirection);
   return true;
 }
 
@@ -204,7 +205,10 @@ VComputeTargetCentreOfMass::VComputeTargetCentreOfMass(const VTargetCentreOfMass
 }
 
 void VComputeTargetCentreOfMass::Rebind(const SegmentLookup& lookup) {
-  m_Terms = static_cast<const VTargetCentreOfMass&>(*m_pTarget).Terms();
+  const auto& target = static_cast<const VTargetCentreOfMass&>(*m_pTarget);
+  m_HeaderParent = target.ParentIdentifier();
+  m_HeaderPosition = target.PositionInParent();
+  m_Terms = target.Terms();
   std::vector<const VComputeSegment*> parents;
   double total = 0.0;
   for (const VCentreOfMassTerm& term : m_Terms) {
@@ -244,6 +248,8 @@ void VComputeTargetCentreOfMass::Residual(ConstView observation, View o_rResidua
 bool VComputeTargetCentreOfMass::WriteToModel(ITargetCalibrated& o_rTarget) const {
   auto* target = dynamic_cast<VTargetCentreOfMass*>(&o_rTarget);
   if (!target || !SameKey(o_rTarget, *m_pTarget)) return false;
+  target->SetParentIdentifier(m_HeaderParent);
+  target->SetPositionInParent(m_HeaderPosition);
   target->SetTerms(m_Terms);
   return true;
 }

@@ -132,6 +132,8 @@ private:
   std::array<std::uint32_t, 2> m_Ids{};
   std::array<Eigen::Vector3d, 2> m_Local;
   Eigen::Vector3d m_Direction;
+  /// The direction as the model gives it (written back as it was).
+  Eigen::Vector3d m_ModelDirection;
   Eigen::Matrix<double, 2, 3> m_Across;
 };
 
@@ -156,6 +158,9 @@ public:
   }
 
 private:
+  /// The model target's own parent and position, unused here but written back.
+  std::uint32_t m_HeaderParent = 0;
+  Eigen::Vector3d m_HeaderPosition = Eigen::Vector3d::Zero();
   std::vector<KinematicAlgo::VCentreOfMassTerm> m_Terms;
   /// Each term's weight over the sum of the weights.
   std::vector<double> m_Share;

@@ -33,6 +33,10 @@ VComputeTargetSingleParent::VComputeTargetSingleParent(const ITargetCalibrated& 
   if (!parent) m_Errors = std::string(className) + " cannot find segment. ";
   if (const auto* single = dynamic_cast<const ITargetSingleParent*>(&target))
     m_ParentId = single->ParentIdentifier();
+  if (const auto* direction = dynamic_cast<const ITargetDirection*>(&target))
+    m_ModelDirection = direction->DirectionInParent();
+  else if (const auto* plane = dynamic_cast<const VTargetPlane*>(&target))
+    m_ModelDirection = plane->WorldNormal();
 }
 
 ITargetSingleParent*
@@ -394,17 +398,17 @@ bool WriteShape(ITargetSingleParent* o_pTarget, const Eigen::Vector3d& direction
 } // namespace
 
 bool VComputeTargetSegmentPlane::WriteToModel(ITargetCalibrated& o_rTarget) const {
-  return WriteShape(WriteParent(o_rTarget, m_Origin), m_Normal, m_ResidualCovariance);
+  return WriteShape(WriteParent(o_rTarget, m_Origin), m_ModelDirection, m_ResidualCovariance);
 }
 
 bool VComputeTargetSegmentRay::WriteToModel(ITargetCalibrated& o_rTarget) const {
-  return WriteShape(WriteParent(o_rTarget, m_Origin), m_Direction, m_ResidualCovariance);
+  return WriteShape(WriteParent(o_rTarget, m_Origin), m_ModelDirection, m_ResidualCovariance);
 }
 
 bool VComputeTargetDirection::WriteToModel(ITargetCalibrated& o_rTarget) const {
   auto* target = dynamic_cast<VTargetDirection*>(&o_rTarget);
   if (!target || !WriteParent(o_rTarget, target->PositionInParent())) return false;
-  target->SetDirectionInParent(m_Direction);
+  target->SetDirectionInParent(m_ModelDirection);
   return true;
 }
 
@@ -421,15 +425,17 @@ bool VComputeRigidBody::WriteToModel(ITargetCalibrated& o_rTarget) const {
       !WriteParent(o_rTarget, m_Body.m_Translation))
     return false;
   target->SetBodyPoseInParent(m_Body);
-  for (std::uint32_t i = 0; i < target->NumMembers(); ++i)
+  for (std::uint32_t i = 0; i < target->NumMembers(); ++i) {
+    target->MemberPtr(i)->SetParentIdentifier(m_ParentId);
     target->MemberPtr(i)->SetPositionInParent(m_InBody[i]);
+  }
   return true;
 }
 
 bool VComputeTargetPlane::WriteToModel(ITargetCalibrated& o_rTarget) const {
   auto* target = dynamic_cast<VTargetPlane*>(&o_rTarget);
   if (!target || !WriteParent(o_rTarget, m_Local)) return false;
-  target->SetWorldPlane(m_Normal, m_Offset);
+  target->SetWorldPlane(m_ModelDirection, m_Offset);
   return true;
 }
 

@@ -94,6 +94,8 @@ protected:
   const VComputeSegment* m_pParent;
   /// The model's parent identifier as read.
   std::uint32_t m_ParentId = 0;
+  /// The model's direction or normal as read, before normalising (written back as it was).
+  Eigen::Vector3d m_ModelDirection = Eigen::Vector3d::Zero();
   Eigen::VectorXd m_Values;
   std::string m_Errors;
   VPose m_Identity;
