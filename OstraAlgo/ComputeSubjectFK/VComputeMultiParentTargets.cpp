@@ -79,9 +79,6 @@ void VComputeTargetRelativeOrientation::Rebind(const SegmentLookup& lookup) {
   m_Orientation = {target.OrientationInParent1(), target.OrientationInParent2()};
   Bind({lookup(m_Ids[0]), lookup(m_Ids[1])},
        [](size_t) { return "VComputeTargetRelativeOrientation cannot find segment. "; });
-  // Unbound, both frames are taken as the world's.
-  Eigen::Map<Eigen::Matrix<double, 3, 3, Eigen::RowMajor>>(m_Values.data()) =
-      m_Orientation[1].transpose() * m_Orientation[0];
 }
 
 void VComputeTargetRelativeOrientation::Update() {
@@ -142,7 +139,6 @@ void VComputeTargetRelativeRay::Rebind(const SegmentLookup& lookup) {
     return k ? "VComputeTargetRelativeRay cannot find segment 2. "
              : "VComputeTargetRelativeRay cannot find segment 1. ";
   });
-  m_Values << m_Local[0], m_Direction, m_Local[1];
 }
 
 void VComputeTargetRelativeRay::Update() {
