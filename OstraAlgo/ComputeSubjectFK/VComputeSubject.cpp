@@ -32,16 +32,11 @@ void VComputeSubject::Build() {
   for (std::uint32_t t = 0; t < m_pSubject->NumTargets(); ++t) {
     const auto target = m_pSubject->Target(t);
     m_ModelTargets.push_back(target);
-    std::unique_ptr<IComputeTarget> computed;
-    if (const auto* two = dynamic_cast<const VTargetRelativePosition*>(target.get()))
-      computed = std::make_unique<VComputeTargetRelativePosition>(
-          *two, SegmentByIdentifier(two->ParentIdentifier1()),
-          SegmentByIdentifier(two->ParentIdentifier2()));
-    else if (const auto* single = dynamic_cast<const ITargetSingleParent*>(target.get()))
-      computed = MakeComputeTarget(*target, SegmentByIdentifier(single->ParentIdentifier()));
+    std::unique_ptr<IComputeTarget> computed = MakeComputeTarget(*target, Lookup());
     if (!computed) continue;
     m_NumTargetParams += computed->NumParams();
     m_Targets.push_back(std::move(computed));
+    m_TargetModelIndex.push_back(t);
   }
   m_Cache.assign(NumParams(), 0.0);
   m_FirstTime = true;
@@ -52,6 +47,10 @@ const VComputeSegment* VComputeSubject::SegmentByIdentifier(std::uint32_t id) co
   for (const VComputeSegment& segment : m_Segments)
     if (segment.Segment().Identifier() == std::int32_t(id)) return &segment;
   return nullptr;
+}
+
+SegmentLookup VComputeSubject::Lookup() const {
+  return [this](std::uint32_t id) { return SegmentByIdentifier(id); };
 }
 
 const VComputeTargetPosition* VComputeSubject::PositionTarget(std::uint32_t i) const {
@@ -223,6 +222,35 @@ bool VComputeSubject::WriteToModel(ISubjectCalibrated& io_rModel) const {
   return true;
 }
 
+bool VComputeSubject::WriteToModel(ISubjectCalibrated& io_rModel, VWithTargets,
+                                   std::string* o_pWhy) const {
+  const auto fail = [&](const std::string& why) {
+    if (o_pWhy) *o_pWhy = why;
+    return false;
+  };
+  if (io_rModel.Segments().Size() != std::int32_t(m_Segments.size()))
+    return fail("the model's tree has another number of segments");
+  if (io_rModel.NumTargets() != m_ModelTargets.size())
+    return fail("the model has another number of targets");
+  // Every target is checked before anything is written, so a refusal changes nothing.
+  for (std::uint32_t t = 0; t < io_rModel.NumTargets(); ++t)
+    if (std::string(io_rModel.Target(t)->Key()) != m_ModelTargets[t]->Key())
+      return fail("the model's target " + std::to_string(t) + " is a " +
+                  io_rModel.Target(t)->Key() + ", not a " + m_ModelTargets[t]->Key());
+  for (size_t i = 0; i < m_Targets.size(); ++i) {
+    const auto* body = dynamic_cast<const VComputeRigidBody*>(m_Targets[i].get());
+    const auto* other =
+        dynamic_cast<const VTargetRigidBody*>(io_rModel.Target(m_TargetModelIndex[i]).get());
+    if (body && other && other->NumMembers() != body->NumMembers())
+      return fail("the model's rigid body " + std::to_string(m_TargetModelIndex[i]) +
+                  " has another number of members");
+  }
+  WriteToModel(io_rModel);
+  for (size_t i = 0; i < m_Targets.size(); ++i)
+    m_Targets[i]->WriteToModel(*io_rModel.Target(m_TargetModelIndex[i]));
+  return true;
+}
+
 } // namespace ComputeSubject
 
 namespace ComputeSubject {
@@ -252,11 +280,8 @@ bool VComputeSubject::ReloadFromModel(std::string* o_pWhy) {
     s.Reload();
   for (auto& target : m_Targets) {
     const auto* single = dynamic_cast<const ITargetSingleParent*>(&target->Target());
-    const auto* two = dynamic_cast<const ITargetTwoParents*>(&target->Target());
-    if (auto* relative = dynamic_cast<VComputeTargetRelativePosition*>(target.get());
-        relative && two)
-      relative->Rebind(SegmentByIdentifier(two->ParentIdentifier1()),
-                       SegmentByIdentifier(two->ParentIdentifier2()));
+    if (auto* multi = dynamic_cast<VComputeTargetMultiParent*>(target.get()))
+      multi->Rebind(Lookup());
     else
       target->Rebind(single ? SegmentByIdentifier(single->ParentIdentifier()) : nullptr);
   }

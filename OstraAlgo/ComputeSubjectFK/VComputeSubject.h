@@ -8,6 +8,7 @@
 // per compute subject; a copy shares nothing that evaluation writes, so copies may run on other
 // threads.
 
+#include "OstraAlgo/ComputeSubjectFK/VComputeMultiParentTargets.h"
 #include "OstraAlgo/ComputeSubjectFK/VComputeSegment.h"
 #include "OstraAlgo/ComputeSubjectFK/VComputeTarget.h"
 
@@ -37,6 +38,10 @@ public:
   virtual void UpdateSegments(ConstView state, std::uint32_t type) = 0;
   virtual void UpdateTargets(ConstView state) = 0;
 };
+
+/// Selects the form of VComputeSubject::WriteToModel that writes the targets too.
+struct VWithTargets {};
+inline constexpr VWithTargets WithTargets{};
 
 class VComputeSubject : public IComputeSubject {
 public:
@@ -103,6 +108,13 @@ public:
   /// the segment of `io_rModel` at the same tree position, with the joint's fixed rotation taken
   /// out again. False, with `io_rModel` untouched, when its tree has another size.
   bool WriteToModel(KinematicAlgo::ISubjectCalibrated& io_rModel) const;
+  /// As above, and writes each target's geometry back into the model's target at the same
+  /// position in its list (see IComputeTarget::WriteToModel). The model must have the tree's
+  /// size and a target list of the same keys (rigid bodies with as many members) as the one
+  /// this subject was built from, for example a copy of it; if not, nothing is written, the
+  /// reason goes to `o_pWhy` and the result is false.
+  bool WriteToModel(KinematicAlgo::ISubjectCalibrated& io_rModel, VWithTargets,
+                    std::string* o_pWhy = nullptr) const;
 
   /// Reads every segment's fixed poses, joint rotation and priors, and every target's geometry,
   /// from the model again, after the caller changed them. The tree's shape, its segment objects,
@@ -146,6 +158,7 @@ public:
 private:
   void Build();
   const VComputeSegment* SegmentByIdentifier(std::uint32_t id) const;
+  SegmentLookup Lookup() const;
   void BuildChain(std::uint32_t index, VTgtChainInfo& o_rInfo) const;
   VTgtChainInfo* Chain(std::uint32_t index);
 
@@ -154,6 +167,9 @@ private:
   std::uint32_t m_UseRotator;
   std::vector<VComputeSegment> m_Segments;
   std::vector<std::unique_ptr<IComputeTarget>> m_Targets;
+  /// Each run-time target's position in the model's target list (targets without a run-time
+  /// form are dropped, so the two lists differ).
+  std::vector<std::uint32_t> m_TargetModelIndex;
   /// The model's targets as of construction (kept alive), to check a reload against.
   std::vector<std::shared_ptr<const KinematicAlgo::ITargetCalibrated>> m_ModelTargets;
   std::map<std::uint32_t, VTgtChainInfo> m_Chains;

@@ -31,6 +31,32 @@ VComputeTargetSingleParent::VComputeTargetSingleParent(const ITargetCalibrated& 
                                                        Eigen::Index numValues)
     : m_pTarget(&target), m_pParent(parent), m_Values(Eigen::VectorXd::Zero(numValues)) {
   if (!parent) m_Errors = std::string(className) + " cannot find segment. ";
+  if (const auto* single = dynamic_cast<const ITargetSingleParent*>(&target))
+    m_ParentId = single->ParentIdentifier();
+  if (const auto* direction = dynamic_cast<const ITargetDirection*>(&target))
+    m_ModelDirection = direction->DirectionInParent();
+  else if (const auto* plane = dynamic_cast<const VTargetPlane*>(&target))
+    m_ModelDirection = plane->WorldNormal();
+}
+
+ITargetSingleParent*
+VComputeTargetSingleParent::WriteParent(ITargetCalibrated& o_rTarget,
+                                        const Eigen::Vector3d& position) const {
+  auto* single = dynamic_cast<ITargetSingleParent*>(&o_rTarget);
+  if (!single || std::strcmp(o_rTarget.Key(), m_pTarget->Key()) != 0) return nullptr;
+  single->SetParentIdentifier(m_ParentId);
+  single->SetPositionInParent(position);
+  return single;
+}
+
+Eigen::Matrix<double, 2, 3> AcrossRows(const Eigen::Vector3d& direction) {
+  Eigen::Index least;
+  direction.cwiseAbs().minCoeff(&least);
+  const Eigen::Vector3d u = direction.cross(Eigen::Vector3d::Unit(least)).normalized();
+  Eigen::Matrix<double, 2, 3> across;
+  across.row(0) = u.transpose();
+  across.row(1) = direction.cross(u).transpose();
+  return across;
 }
 
 // --- Point --------------------------------------------------------------------------------
@@ -97,7 +123,7 @@ VComputeTargetSegmentPlane::VComputeTargetSegmentPlane(const VTargetSegmentPlane
                                                        const VComputeSegment* parent)
     : VComputeTargetSingleParent(target, parent, "VComputeTargetSegmentPlane", 6),
       m_Origin(target.PositionInParent()), m_Normal(target.DirectionInParent().normalized()) {
-  const Eigen::MatrixXd& c = target.ResidualCovariance();
+  const Eigen::MatrixXd& c = m_ResidualCovariance = target.ResidualCovariance();
   if (c.rows() == 1 && c.cols() == 1) m_Scale = 1.0 / std::sqrt(std::abs(c(0, 0)) + 1e-10);
   m_Values << m_Origin, m_Normal;
 }
@@ -137,14 +163,8 @@ VComputeTargetSegmentRay::VComputeTargetSegmentRay(const VTargetSegmentRay& targ
                                                    const VComputeSegment* parent)
     : VComputeTargetSingleParent(target, parent, "VComputeTargetSegmentRay", 6),
       m_Origin(target.PositionInParent()), m_Direction(target.DirectionInParent().normalized()) {
-  // Two unit rows across the direction, from the axis least aligned with it.
-  Eigen::Index least;
-  m_Direction.cwiseAbs().minCoeff(&least);
-  const Eigen::Vector3d u = m_Direction.cross(Eigen::Vector3d::Unit(least)).normalized();
-  const Eigen::Vector3d v = m_Direction.cross(u);
-  m_Across.row(0) = u.transpose();
-  m_Across.row(1) = v.transpose();
-  const Eigen::MatrixXd& c = target.ResidualCovariance();
+  m_Across = AcrossRows(m_Direction);
+  const Eigen::MatrixXd& c = m_ResidualCovariance = target.ResidualCovariance();
   if (c.rows() == 2 && c.cols() == 2) m_Across = InverseRoot<2>(c, 1e-10) * m_Across;
   m_Values << m_Origin, m_Direction;
 }
@@ -239,9 +259,11 @@ void VComputeTargetOrientation::Residual(ConstView observation, View o_rResidual
 VComputeRigidBody::VComputeRigidBody(const VTargetRigidBody& target, const VComputeSegment* parent)
     : VComputeTargetSingleParent(target, parent, "VComputeRigidBody",
                                  3 * Eigen::Index(target.NumMembers())) {
-  const VPose& B = target.BodyPoseInParent();
-  for (std::uint32_t i = 0; i < target.NumMembers(); ++i)
-    m_Points.push_back(B.m_Rotation * target.Member(i).PositionInParent() + B.m_Translation);
+  const VPose& B = m_Body = target.BodyPoseInParent();
+  for (std::uint32_t i = 0; i < target.NumMembers(); ++i) {
+    m_InBody.push_back(target.Member(i).PositionInParent());
+    m_Points.push_back(B.m_Rotation * m_InBody.back() + B.m_Translation);
+  }
   m_Weights.assign(m_Points.size(), 1.0);
   for (size_t i = 0; i < m_Points.size(); ++i)
     m_Values.segment<3>(Eigen::Index(3 * i)) = m_Points[i];
@@ -331,50 +353,6 @@ void VComputeTargetPlane::Rebind(const VComputeSegment* parent) {
   *this = VComputeTargetPlane(static_cast<const VTargetPlane&>(*m_pTarget), parent);
 }
 
-// --- Relative position ---------------------------------------------------------------------
-
-VComputeTargetRelativePosition::VComputeTargetRelativePosition(
-    const VTargetRelativePosition& target, const VComputeSegment* first,
-    const VComputeSegment* second)
-    : m_pTarget(&target) {
-  Rebind(first, second);
-}
-
-void VComputeTargetRelativePosition::Rebind(const VComputeSegment* first,
-                                            const VComputeSegment* second) {
-  m_Local = {m_pTarget->PositionInParent1(), m_pTarget->PositionInParent2()};
-  m_Parents = {first, second};
-  if (!first || !second) m_Parents = {nullptr, nullptr};
-  m_Errors = m_Parents[0] ? "" : "VComputeTargetRelativePosition cannot find segment. ";
-  m_Values.setZero();
-}
-
-void VComputeTargetRelativePosition::Update() {
-  if (!m_Parents[0]) return;
-  const VPose& A = m_Parents[0]->WorldPose();
-  const VPose& B = m_Parents[1]->WorldPose();
-  m_Values =
-      (A.m_Rotation * m_Local[0] + A.m_Translation) - (B.m_Rotation * m_Local[1] + B.m_Translation);
-}
-
-void VComputeTargetRelativePosition::ValueJacobian(JacobianRef o_rJacobian) const {
-  o_rJacobian.setZero();
-  if (!m_Parents[0]) return;
-  // Blocks of both chains add up where they share ancestors.
-  for (int k = 0; k < 2; ++k) {
-    const double sign = k ? -1.0 : 1.0;
-    const auto& blocks = m_Parents[size_t(k)]->JacobianBlocks();
-    for (std::uint32_t b = 0; b < m_Parents[size_t(k)]->NumJacobianBlocks(); ++b)
-      for (std::uint32_t i = 0; i < blocks[b].m_NumParams; ++i)
-        o_rJacobian.col(Eigen::Index(blocks[b].m_FirstParam + i)).head<3>() +=
-            sign * (blocks[b].m_dR[i] * m_Local[size_t(k)] + blocks[b].m_dT[i]);
-  }
-}
-
-void VComputeTargetRelativePosition::Residual(ConstView observation, View o_rResidual) const {
-  Eigen::Map<Eigen::Vector3d>(o_rResidual.data()) = m_Values - Point(observation);
-}
-
 // Each run-time target re-reads its model target by being built again in place; the model
 // target's class is the one it was made from.
 void VComputeTargetPosition::Rebind(const VComputeSegment* parent) {
@@ -398,11 +376,78 @@ void VComputeRigidBody::Rebind(const VComputeSegment* parent) {
   if (weights.size() == m_Weights.size()) m_Weights = std::move(weights);
 }
 
+// --- Writing back -------------------------------------------------------------------------
+
+bool VComputeTargetPosition::WriteToModel(ITargetCalibrated& o_rTarget) const {
+  if (!WriteParent(o_rTarget, m_Local)) return false;
+  if (auto* covariance = dynamic_cast<ITargetCovariance3*>(&o_rTarget);
+      covariance && m_HasCovariance)
+    covariance->SetCovariance(m_Covariance);
+  return true;
+}
+
+namespace {
+bool WriteShape(ITargetSingleParent* o_pTarget, const Eigen::Vector3d& direction,
+                const Eigen::MatrixXd& covariance) {
+  auto* shaped = dynamic_cast<VTargetPointDirection*>(o_pTarget);
+  if (!shaped) return false;
+  shaped->SetDirectionInParent(direction);
+  shaped->SetResidualCovariance(covariance);
+  return true;
+}
+} // namespace
+
+bool VComputeTargetSegmentPlane::WriteToModel(ITargetCalibrated& o_rTarget) const {
+  return WriteShape(WriteParent(o_rTarget, m_Origin), m_ModelDirection, m_ResidualCovariance);
+}
+
+bool VComputeTargetSegmentRay::WriteToModel(ITargetCalibrated& o_rTarget) const {
+  return WriteShape(WriteParent(o_rTarget, m_Origin), m_ModelDirection, m_ResidualCovariance);
+}
+
+bool VComputeTargetDirection::WriteToModel(ITargetCalibrated& o_rTarget) const {
+  auto* target = dynamic_cast<VTargetDirection*>(&o_rTarget);
+  if (!target || !WriteParent(o_rTarget, target->PositionInParent())) return false;
+  target->SetDirectionInParent(m_ModelDirection);
+  return true;
+}
+
+bool VComputeTargetOrientation::WriteToModel(ITargetCalibrated& o_rTarget) const {
+  auto* target = dynamic_cast<VTargetOrientation*>(&o_rTarget);
+  if (!target || !WriteParent(o_rTarget, target->PositionInParent())) return false;
+  target->SetOrientationInParent(m_Orientation);
+  return true;
+}
+
+bool VComputeRigidBody::WriteToModel(ITargetCalibrated& o_rTarget) const {
+  auto* target = dynamic_cast<VTargetRigidBody*>(&o_rTarget);
+  if (!target || target->NumMembers() != m_InBody.size() ||
+      !WriteParent(o_rTarget, m_Body.m_Translation))
+    return false;
+  target->SetBodyPoseInParent(m_Body);
+  for (std::uint32_t i = 0; i < target->NumMembers(); ++i) {
+    target->MemberPtr(i)->SetParentIdentifier(m_ParentId);
+    target->MemberPtr(i)->SetPositionInParent(m_InBody[i]);
+  }
+  return true;
+}
+
+bool VComputeTargetPlane::WriteToModel(ITargetCalibrated& o_rTarget) const {
+  auto* target = dynamic_cast<VTargetPlane*>(&o_rTarget);
+  if (!target || !WriteParent(o_rTarget, m_Local)) return false;
+  target->SetWorldPlane(m_ModelDirection, m_Offset);
+  return true;
+}
+
 std::unique_ptr<IComputeTarget> MakeComputeTarget(const ITargetCalibrated& target,
                                                   const VComputeSegment* parent) {
   const char* key = target.Key();
   const auto is = [key](const char* k) { return std::strcmp(key, k) == 0; };
-  if (is("TargetPosition") || is("TargetPositionWithCovariance"))
+  // The labelling forms of the covariance point evaluate as it does; the point with a range
+  // alone has no run-time form.
+  if (is("TargetPosition") || is("TargetPositionWithCovariance") ||
+      is("TargetPositionCovarianceRange") || is("TargetPositionCovarianceRangeNormal") ||
+      is("TargetPositionCovarianceDescriptor"))
     return std::make_unique<VComputeTargetPosition>(target, parent);
   if (const auto* plane = dynamic_cast<const VTargetSegmentPlane*>(&target))
     return std::make_unique<VComputeTargetSegmentPlane>(*plane, parent);

@@ -13,6 +13,7 @@
 
 #include "OstraAlgo/KinematicAlgo/VCalibratedTargets.h"
 
+#include <functional>
 #include <memory>
 #include <string>
 
@@ -34,6 +35,11 @@ public:
   virtual void Rebind(const VComputeSegment* parent) = 0;
   /// The message of a failed binding, empty when bound.
   virtual const std::string& Errors() const = 0;
+  /// Writes the geometry this target evaluates with (parents, fixed points, directions,
+  /// rotations, covariances) into `o_rTarget`, a model target of the same key. False, with
+  /// nothing written, for a target of another key. Statistics the run-time target does not use
+  /// (a labelling mean, range, view normal or descriptor) are left as they are.
+  virtual bool WriteToModel(KinematicAlgo::ITargetCalibrated& o_rTarget) const = 0;
 
   /// The world quantity as of the last Update.
   virtual std::uint32_t NumValues() const = 0;
@@ -70,6 +76,10 @@ protected:
                              const VComputeSegment* parent, const char* className,
                              Eigen::Index numValues);
   const VPose& ParentPose() const { return m_pParent ? m_pParent->WorldPose() : m_Identity; }
+  /// For WriteToModel: the model target as a single-parent target of this key with its parent
+  /// and `position` written, or null (nothing written).
+  KinematicAlgo::ITargetSingleParent* WriteParent(KinematicAlgo::ITargetCalibrated& o_rTarget,
+                                                  const Eigen::Vector3d& position) const;
   /// Calls f(column, ∂R, ∂T) for each parameter of each Jacobian block of the parent: the
   /// derivative of the parent's world pose.
   template <class F> void ForEachDerivative(F&& f) const {
@@ -82,6 +92,10 @@ protected:
 
   const KinematicAlgo::ITargetCalibrated* m_pTarget;
   const VComputeSegment* m_pParent;
+  /// The model's parent identifier as read.
+  std::uint32_t m_ParentId = 0;
+  /// The model's direction or normal as read, before normalising (written back as it was).
+  Eigen::Vector3d m_ModelDirection = Eigen::Vector3d::Zero();
   Eigen::VectorXd m_Values;
   std::string m_Errors;
   VPose m_Identity;
@@ -98,6 +112,7 @@ public:
                          const VComputeSegment* parent);
   void Update() override;
   void Rebind(const VComputeSegment* parent) override;
+  bool WriteToModel(KinematicAlgo::ITargetCalibrated& o_rTarget) const override;
   void ValueJacobian(JacobianRef o_rJacobian) const override { Jacobian(o_rJacobian); }
   std::uint32_t ObservationSize() const override { return 3; }
   std::uint32_t NumResiduals() const override { return 3; }
@@ -127,6 +142,7 @@ public:
                              const VComputeSegment* parent);
   void Update() override;
   void Rebind(const VComputeSegment* parent) override;
+  bool WriteToModel(KinematicAlgo::ITargetCalibrated& o_rTarget) const override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 3; }
   std::uint32_t NumResiduals() const override { return 1; }
@@ -136,6 +152,7 @@ public:
 private:
   Eigen::Vector3d m_Origin;
   Eigen::Vector3d m_Normal;
+  Eigen::MatrixXd m_ResidualCovariance;
   double m_Scale = 1.0;
 };
 
@@ -149,6 +166,7 @@ public:
                            const VComputeSegment* parent);
   void Update() override;
   void Rebind(const VComputeSegment* parent) override;
+  bool WriteToModel(KinematicAlgo::ITargetCalibrated& o_rTarget) const override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 3; }
   std::uint32_t NumResiduals() const override { return 2; }
@@ -160,6 +178,7 @@ public:
 private:
   Eigen::Vector3d m_Origin;
   Eigen::Vector3d m_Direction;
+  Eigen::MatrixXd m_ResidualCovariance;
   Eigen::Matrix<double, 2, 3> m_Across;
 };
 
@@ -170,6 +189,7 @@ public:
                           const VComputeSegment* parent);
   void Update() override;
   void Rebind(const VComputeSegment* parent) override;
+  bool WriteToModel(KinematicAlgo::ITargetCalibrated& o_rTarget) const override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 3; }
   std::uint32_t NumResiduals() const override { return 3; }
@@ -190,6 +210,7 @@ public:
                             const VComputeSegment* parent);
   void Update() override;
   void Rebind(const VComputeSegment* parent) override;
+  bool WriteToModel(KinematicAlgo::ITargetCalibrated& o_rTarget) const override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 9; }
   std::uint32_t NumResiduals() const override { return 9; }
@@ -210,6 +231,7 @@ public:
   VComputeRigidBody(const KinematicAlgo::VTargetRigidBody& target, const VComputeSegment* parent);
   void Update() override;
   void Rebind(const VComputeSegment* parent) override;
+  bool WriteToModel(KinematicAlgo::ITargetCalibrated& o_rTarget) const override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 3 * NumMembers(); }
   std::uint32_t NumResiduals() const override;
@@ -224,6 +246,9 @@ public:
   double MemberWeight(std::uint32_t i) const { return m_Weights[i]; }
 
 private:
+  VPose m_Body;
+  /// Each member's place in the body, and in the parent segment.
+  std::vector<Eigen::Vector3d> m_InBody;
   std::vector<Eigen::Vector3d> m_Points;
   std::vector<double> m_Weights;
 };
@@ -235,6 +260,7 @@ public:
   VComputeTargetPlane(const KinematicAlgo::VTargetPlane& target, const VComputeSegment* parent);
   void Update() override;
   void Rebind(const VComputeSegment* parent) override;
+  bool WriteToModel(KinematicAlgo::ITargetCalibrated& o_rTarget) const override;
   void ValueJacobian(JacobianRef o_rJacobian) const override;
   std::uint32_t ObservationSize() const override { return 0; }
   std::uint32_t NumResiduals() const override { return 1; }
@@ -247,42 +273,21 @@ private:
   double m_Offset;
 };
 
-/// The world offset x1 - x2 between a point fixed in one segment and a point fixed in another.
-/// Values (3): the offset. Residual (3): offset - observed.
-class VComputeTargetRelativePosition : public IComputeTarget {
-public:
-  /// Either parent null leaves the target unbound: "VComputeTargetRelativePosition cannot find
-  /// segment. ", values zero, derivatives zero.
-  VComputeTargetRelativePosition(const KinematicAlgo::VTargetRelativePosition& target,
-                                 const VComputeSegment* first, const VComputeSegment* second);
-  const KinematicAlgo::ITargetCalibrated& Target() const override { return *m_pTarget; }
-  std::uint32_t NumParams() const override { return 0; }
-  void Update() override;
-  /// Rebinding to one parent is not enough for this target: it becomes unbound.
-  void Rebind(const VComputeSegment*) override { Rebind(nullptr, nullptr); }
-  void Rebind(const VComputeSegment* first, const VComputeSegment* second);
-  const std::string& Errors() const override { return m_Errors; }
-  std::uint32_t NumValues() const override { return 3; }
-  ConstView Values() const override { return {m_Values.data(), 3}; }
-  void ValueJacobian(JacobianRef o_rJacobian) const override;
-  std::uint32_t ObservationSize() const override { return 3; }
-  std::uint32_t NumResiduals() const override { return 3; }
-  void Residual(ConstView observation, View o_rResidual) const override;
-  void ResidualJacobian(ConstView observation, JacobianRef o_rJacobian) const override {
-    ValueJacobian(o_rJacobian);
-  }
-
-private:
-  const KinematicAlgo::VTargetRelativePosition* m_pTarget;
-  std::array<const VComputeSegment*, 2> m_Parents;
-  std::array<Eigen::Vector3d, 2> m_Local;
-  Eigen::Vector3d m_Values = Eigen::Vector3d::Zero();
-  std::string m_Errors;
-};
+/// Two orthonormal rows across the unit vector `direction`, built from the axis least aligned
+/// with it.
+Eigen::Matrix<double, 2, 3> AcrossRows(const Eigen::Vector3d& direction);
 
 /// The run-time target of a model target, bound to `parent` (null when its segment is not in
 /// the tree). Null for a model class without a run-time form.
 std::unique_ptr<IComputeTarget> MakeComputeTarget(const KinematicAlgo::ITargetCalibrated& target,
                                                   const VComputeSegment* parent);
+
+/// Finds a segment by its model identifier (null when there is none).
+using SegmentLookup = std::function<const VComputeSegment*(std::uint32_t id)>;
+
+/// The run-time target of any model target, single-parent or not, its parents found through
+/// `lookup`. Null for a model class without a run-time form.
+std::unique_ptr<IComputeTarget> MakeComputeTarget(const KinematicAlgo::ITargetCalibrated& target,
+                                                  const SegmentLookup& lookup);
 
 } // namespace ComputeSubject

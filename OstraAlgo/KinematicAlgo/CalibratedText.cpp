@@ -38,6 +38,12 @@ void Pose(std::ostream& o_rStream, std::string_view label, const VPose& pose) {
   Numbers(o_rStream, label, values, 12);
 }
 
+void Matrix3(std::ostream& o_rStream, std::string_view label, const Eigen::Matrix3d& m) {
+  const Eigen::Matrix<double, 3, 3, Eigen::RowMajor> rows = m;
+  Numbers(o_rStream, label, rows.data(), 9);
+  o_rStream << '\n';
+}
+
 } // namespace Text
 
 namespace {
@@ -158,6 +164,13 @@ bool VTextReader::Pose(std::string_view label, VPose& o_rPose) {
       o_rPose.m_Rotation(r, c) = values[3 * r + c];
   for (int i = 0; i < 3; ++i)
     o_rPose.m_Translation[i] = values[9 + i];
+  return true;
+}
+
+bool VTextReader::Matrix3(std::string_view label, Eigen::Matrix3d& o_rMatrix) {
+  Eigen::Matrix<double, 3, 3, Eigen::RowMajor> rows;
+  if (!Label(label) || !Numbers(rows.data(), 9)) return false;
+  o_rMatrix = rows;
   return true;
 }
 

@@ -25,6 +25,8 @@ void Numbers(std::ostream& o_rStream, std::string_view label, const double* valu
 void String(std::ostream& o_rStream, std::string_view label, const std::string& value);
 /// Rotation row by row, then translation.
 void Pose(std::ostream& o_rStream, std::string_view label, const VPose& pose);
+/// A 3x3 matrix row by row, then a line break.
+void Matrix3(std::ostream& o_rStream, std::string_view label, const Eigen::Matrix3d& m);
 } // namespace Text
 
 /// Reads the text form from memory. Each operation skips white space first and returns false
@@ -44,6 +46,8 @@ public:
   /// A length line, `label`, one blank, then exactly that many bytes.
   bool String(std::string_view label, std::string& o_rValue);
   bool Pose(std::string_view label, VPose& o_rPose);
+  /// A 3x3 matrix written by Text::Matrix3.
+  bool Matrix3(std::string_view label, Eigen::Matrix3d& o_rMatrix);
   /// Records `message` (if no error is recorded yet) at the current line; returns false.
   bool Fail(const std::string& message);
 

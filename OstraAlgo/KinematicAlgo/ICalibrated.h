@@ -82,6 +82,15 @@ public:
   virtual bool Read(VTextReader& io_rReader) = 0;
 };
 
+class ITargetCalibrated;
+
+/// Receives a target with its factory key (ITargetCalibrated::Visit).
+class ITargetVisitor {
+public:
+  virtual ~ITargetVisitor() = default;
+  virtual void Visit(const char* key, const ITargetCalibrated& target) = 0;
+};
+
 class ITargetCalibrated {
 public:
   virtual ~ITargetCalibrated() = default;
@@ -91,6 +100,8 @@ public:
   virtual const char* Key() const = 0;
   /// The factory's index of Key().
   std::int32_t Type() const;
+  /// Calls the receiver with Key() and this target.
+  virtual void Visit(ITargetVisitor& receiver) const { receiver.Visit(Key(), *this); }
   virtual std::int32_t Identifier() const = 0;
   virtual void SetIdentifier(std::int32_t id) = 0;
   virtual const std::string& Name() const = 0;

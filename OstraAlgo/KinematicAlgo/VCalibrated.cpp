@@ -79,24 +79,43 @@ VTargetFactory& VTargetFactory::Factory() {
   return factory;
 }
 
-void VTargetFactory::Register(const std::string& key, Creator creator) {
-  auto it = m_Creators.find(key);
-  if (it != m_Creators.end()) {
-    it->second.second = std::move(creator);
+void VTargetFactory::Register(const std::string& key, Creator creator,
+                              const std::string& displayName, const std::string& description) {
+  const std::string shown = displayName.empty() ? key : displayName;
+  auto it = m_Entries.find(key);
+  if (it != m_Entries.end()) {
+    it->second = {it->second.m_Index, std::move(creator), shown, description};
     return;
   }
-  const std::int32_t index = std::int32_t(m_Creators.size());
-  m_Creators.emplace(key, std::make_pair(index, std::move(creator)));
+  const std::int32_t index = std::int32_t(m_Entries.size());
+  m_Entries.emplace(key, VEntry{index, std::move(creator), shown, description});
 }
 
 std::shared_ptr<ITargetCalibrated> VTargetFactory::Create(const std::string& key) const {
-  auto it = m_Creators.find(key);
-  return it == m_Creators.end() ? nullptr : it->second.second();
+  auto it = m_Entries.find(key);
+  return it == m_Entries.end() ? nullptr : it->second.m_Creator();
 }
 
 std::int32_t VTargetFactory::Index(const std::string& key) const {
-  auto it = m_Creators.find(key);
-  return it == m_Creators.end() ? -1 : it->second.first;
+  auto it = m_Entries.find(key);
+  return it == m_Entries.end() ? -1 : it->second.m_Index;
+}
+
+std::string VTargetFactory::DisplayName(const std::string& key) const {
+  auto it = m_Entries.find(key);
+  return it == m_Entries.end() ? std::string() : it->second.m_DisplayName;
+}
+
+std::string VTargetFactory::Description(const std::string& key) const {
+  auto it = m_Entries.find(key);
+  return it == m_Entries.end() ? std::string() : it->second.m_Description;
+}
+
+std::vector<std::string> VTargetFactory::Keys() const {
+  std::vector<std::string> keys(m_Entries.size());
+  for (const auto& [key, entry] : m_Entries)
+    keys[size_t(entry.m_Index)] = key;
+  return keys;
 }
 
 VSubjectCalibrated::VSubjectCalibrated() {

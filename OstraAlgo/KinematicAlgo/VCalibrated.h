@@ -127,21 +127,35 @@ private:
   Eigen::Matrix3d m_Covariance = Eigen::Matrix3d::Zero();
 };
 
-/// Creators of model targets by key, each with its registration index.
+/// Creators of model targets by key, each with its registration index, the name a user sees and
+/// a description of what the target does.
 class VTargetFactory {
 public:
   using Creator = std::function<std::shared_ptr<ITargetCalibrated>()>;
   /// The process-wide factory, with the built-in classes registered.
   static VTargetFactory& Factory();
-  /// Registers `key`; a key registered twice keeps its first index and takes the new creator.
-  void Register(const std::string& key, Creator creator);
+  /// Registers `key`; a key registered twice keeps its first index and takes the new creator,
+  /// display name and description. The display name defaults to the key.
+  void Register(const std::string& key, Creator creator, const std::string& displayName = {},
+                const std::string& description = {});
   /// Null for an unknown key.
   std::shared_ptr<ITargetCalibrated> Create(const std::string& key) const;
   /// -1 for an unknown key.
   std::int32_t Index(const std::string& key) const;
+  /// Empty for an unknown key.
+  std::string DisplayName(const std::string& key) const;
+  std::string Description(const std::string& key) const;
+  /// Every key, in registration order (by index).
+  std::vector<std::string> Keys() const;
 
 private:
-  std::map<std::string, std::pair<std::int32_t, Creator>> m_Creators;
+  struct VEntry {
+    std::int32_t m_Index;
+    Creator m_Creator;
+    std::string m_DisplayName;
+    std::string m_Description;
+  };
+  std::map<std::string, VEntry> m_Entries;
 };
 
 class VSubjectCalibrated : public ISubjectCalibrated {

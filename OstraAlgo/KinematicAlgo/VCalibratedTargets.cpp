@@ -44,23 +44,11 @@ bool VTargetPlane::Equals(const ITargetCalibrated& o) const {
          m_Offset == other->m_Offset;
 }
 
-bool VTargetRelativePosition::Equals(const ITargetCalibrated& o) const {
-  const auto* other = dynamic_cast<const VTargetRelativePosition*>(&o);
-  return other && m_Name == other->m_Name && m_Parents == other->m_Parents &&
-         m_Positions[0] == other->m_Positions[0] && m_Positions[1] == other->m_Positions[1];
-}
-
-void RegisterModelTargets(VTargetFactory& f) {
-  f.Register("TargetPosition", [] { return std::make_shared<VTargetPosition>(); });
-  f.Register("TargetOrientation", [] { return std::make_shared<VTargetOrientation>(); });
-  f.Register("TargetPositionWithCovariance",
-             [] { return std::make_shared<VTargetPositionWithCovariance>(); });
-  f.Register("TargetSegmentRay", [] { return std::make_shared<VTargetSegmentRay>(); });
-  f.Register("TargetSegmentPlane", [] { return std::make_shared<VTargetSegmentPlane>(); });
-  f.Register("TargetRigidBody", [] { return std::make_shared<VTargetRigidBody>(); });
-  f.Register("TargetDirection", [] { return std::make_shared<VTargetDirection>(); });
-  f.Register("TargetPlane", [] { return std::make_shared<VTargetPlane>(); });
-  f.Register("TargetRelativePosition", [] { return std::make_shared<VTargetRelativePosition>(); });
+bool VTargetBetweenSegments::Equals(const ITargetCalibrated& o) const {
+  const auto* other = dynamic_cast<const VTargetBetweenSegments*>(&o);
+  return other && std::string(Key()) == o.Key() && m_Name == other->m_Name &&
+         m_Parents == other->m_Parents && m_Positions[0] == other->m_Positions[0] &&
+         m_Positions[1] == other->m_Positions[1];
 }
 
 } // namespace KinematicAlgo

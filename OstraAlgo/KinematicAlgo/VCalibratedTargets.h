@@ -166,15 +166,11 @@ public:
                                      const Eigen::Vector3d& second) = 0;
 };
 
-/// The offset between a point fixed in one segment and a point fixed in another:
-/// "TargetRelativePosition".
-class VTargetRelativePosition : public ITargetCalibrated, public ITargetTwoParents {
+/// What every target between two segments holds: a name, an identifier, the two parents and
+/// a point fixed in each. Equality compares the key too, so two classes never compare equal.
+class VTargetBetweenSegments : public ITargetCalibrated, public ITargetTwoParents {
 public:
-  std::shared_ptr<ITargetCalibrated> Clone() const override {
-    return std::make_shared<VTargetRelativePosition>(*this);
-  }
   bool Equals(const ITargetCalibrated& other) const override;
-  const char* Key() const override { return "TargetRelativePosition"; }
   std::int32_t Identifier() const override { return m_Identifier; }
   void SetIdentifier(std::int32_t id) override { m_Identifier = id; }
   const std::string& Name() const override { return m_Name; }
@@ -189,6 +185,7 @@ public:
   void SetPositionsInParents(const Eigen::Vector3d& first, const Eigen::Vector3d& second) override {
     m_Positions = {first, second};
   }
+  /// Name, identifier, both parents, both points.
   void Write(std::ostream& o_rStream) const override;
   bool Read(VTextReader& io_rReader) override;
 
@@ -199,7 +196,18 @@ private:
   std::array<Eigen::Vector3d, 2> m_Positions{Eigen::Vector3d::Zero(), Eigen::Vector3d::Zero()};
 };
 
-/// Registers every model target class with `factory`, in a fixed order (the order gives Type()).
+/// The offset between a point fixed in one segment and a point fixed in another:
+/// "TargetRelativePosition".
+class VTargetRelativePosition : public VTargetBetweenSegments {
+public:
+  std::shared_ptr<ITargetCalibrated> Clone() const override {
+    return std::make_shared<VTargetRelativePosition>(*this);
+  }
+  const char* Key() const override { return "TargetRelativePosition"; }
+};
+
+/// Registers every model target class with `factory` (with its display name and description),
+/// in a fixed order: the order gives Type().
 void RegisterModelTargets(VTargetFactory& factory);
 
 } // namespace KinematicAlgo

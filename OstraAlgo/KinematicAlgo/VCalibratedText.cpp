@@ -209,7 +209,7 @@ bool VTargetPlane::Read(VTextReader& r) {
   return true;
 }
 
-void VTargetRelativePosition::Write(std::ostream& o) const {
+void VTargetBetweenSegments::Write(std::ostream& o) const {
   Text::String(o, "Target: ", m_Name);
   o << " ID: " << m_Identifier << '\n'
     << "ParentID1: " << m_Parents[0] << " ParentID2: " << m_Parents[1] << '\n';
@@ -218,7 +218,7 @@ void VTargetRelativePosition::Write(std::ostream& o) const {
   o << '\n';
 }
 
-bool VTargetRelativePosition::Read(VTextReader& r) {
+bool VTargetBetweenSegments::Read(VTextReader& r) {
   return r.String("Target: ", m_Name) && r.Label(" ID: ") && r.Int(m_Identifier) &&
          r.Label("ParentID1: ") && r.UInt(m_Parents[0]) && r.Label(" ParentID2: ") &&
          r.UInt(m_Parents[1]) && r.Label(" PosInParent1: ") &&

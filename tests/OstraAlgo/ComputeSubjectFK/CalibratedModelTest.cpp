@@ -44,7 +44,7 @@ TEST(CalibratedModel, ACopySharesNothingAndKeepsMarkersTiedToTheirTargets) {
 
 TEST(CalibratedModel, FactoryKnowsTargetsByKeyInRegistrationOrder) {
   EXPECT_EQ(VTargetPosition().Type(), 0);
-  EXPECT_EQ(VTargetPositionWithCovariance().Type(), 2);
+  EXPECT_EQ(VTargetPositionWithCovariance().Type(), 5);
   EXPECT_EQ(VTargetFactory::Factory().Index("NoSuchTarget"), -1);
   EXPECT_EQ(VTargetFactory::Factory().Create("NoSuchTarget"), nullptr);
   EXPECT_STREQ(VTargetFactory::Factory().Create("TargetPositionWithCovariance")->Key(),

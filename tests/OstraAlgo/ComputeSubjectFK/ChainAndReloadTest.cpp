@@ -2,6 +2,7 @@
 // state ranges, and reloading a compute subject from a changed model.
 
 #include "EveryKindSubject.h"
+#include "TargetTestSupport.h"
 
 #include "OstraAlgo/ComputeSubjectFK/VComputeSubject.h"
 
@@ -11,18 +12,6 @@ namespace KinematicTest {
 namespace {
 
 using namespace ComputeSubject;
-
-Eigen::VectorXd RandomState(std::uint32_t n, std::mt19937& gen) {
-  std::uniform_real_distribution<double> u(-2.5, 2.5);
-  Eigen::VectorXd x(n);
-  for (auto& v : x)
-    v = u(gen);
-  return x;
-}
-
-ConstView Span(const Eigen::VectorXd& v) {
-  return {v.data(), size_t(v.size())};
-}
 
 Eigen::VectorXd ValuesOf(const IComputeTarget& t) {
   return Eigen::Map<const Eigen::VectorXd>(t.Values().data(), Eigen::Index(t.NumValues()));

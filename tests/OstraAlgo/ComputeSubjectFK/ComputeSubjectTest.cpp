@@ -2,6 +2,7 @@
 // central finite differences, the state cache, and copies.
 
 #include "RandomSubject.h"
+#include "TargetTestSupport.h"
 
 #include "OstraAlgo/ComputeSubjectFK/VComputeSubject.h"
 
@@ -22,10 +23,6 @@ Eigen::VectorXd RandomJointState(const VComputeSubject& cs, std::mt19937& gen) {
           i < segment.Joint()->NumRotationParams() ? angle(gen) : length(gen);
   }
   return x;
-}
-
-ConstView Span(const Eigen::VectorXd& v) {
-  return {v.data(), size_t(v.size())};
 }
 
 // World poses straight from the model: W = W_parent P A J A⁻¹ Q⁻¹.

@@ -3,6 +3,7 @@
 // the free-pose Jacobian type, and the model targets made from subject records.
 
 #include "EveryKindSubject.h"
+#include "TargetTestSupport.h"
 
 #include "OstraAlgo/ComputeSubjectFK/VComputeSubject.h"
 #include "OstraAlgo/KinematicAlgo/SubjectCalibratedFromRecord.h"
@@ -18,60 +19,9 @@ namespace {
 
 using namespace ComputeSubject;
 
-Eigen::VectorXd RandomState(std::uint32_t n, std::mt19937& gen) {
-  std::uniform_real_distribution<double> u(-2.5, 2.5);
-  Eigen::VectorXd x(n);
-  for (auto& v : x)
-    v = u(gen);
-  return x;
-}
+using TargetKinds = ComputeTargetFixture;
 
-ConstView Span(const Eigen::VectorXd& v) {
-  return {v.data(), size_t(v.size())};
-}
-
-// Values and residuals of target t at state x.
-Eigen::VectorXd Outputs(VComputeSubject& cs, std::uint32_t t, const Eigen::VectorXd& x,
-                        const Eigen::VectorXd& observation) {
-  cs.Update(Span(x));
-  const IComputeTarget& target = cs.Target(t);
-  Eigen::VectorXd out(target.NumValues() + target.NumResiduals());
-  std::copy(target.Values().begin(), target.Values().end(), out.data());
-  target.Residual(Span(observation), View(out.data() + target.NumValues(), target.NumResiduals()));
-  return out;
-}
-
-// Worst relative column error of the value and residual Jacobians of every target.
-double WorstTargetJacobianError(VComputeSubject& cs, const Eigen::VectorXd& x, std::mt19937& gen) {
-  double worst = 0.0;
-  for (std::uint32_t t = 0; t < cs.NumTargets(); ++t) {
-    const IComputeTarget& target = cs.Target(t);
-    Eigen::VectorXd observation(target.ObservationSize());
-    for (std::uint32_t i = 0; i < target.ObservationSize(); i += 3)
-      observation.segment<3>(i) = RandomVector(gen, 200);
-    if (target.ObservationSize() == 9) {
-      const Matrix3r R = Exp(RandomVector(gen, 1)); // row-major, as the residual reads it
-      observation = Eigen::Map<const Eigen::VectorXd>(R.data(), 9);
-    }
-    cs.UpdateSegments(Span(x), EChain);
-    Eigen::MatrixXd analytic(target.NumValues() + target.NumResiduals(), x.size());
-    target.ValueJacobian(analytic.topRows(target.NumValues()));
-    target.ResidualJacobian(Span(observation), analytic.bottomRows(target.NumResiduals()));
-    for (Eigen::Index i = 0; i < x.size(); ++i) {
-      const double h = 1e-6 * std::max(1.0, std::abs(x[i]));
-      Eigen::VectorXd plus = x, minus = x;
-      plus[i] += h;
-      minus[i] -= h;
-      const Eigen::VectorXd numeric =
-          (Outputs(cs, t, plus, observation) - Outputs(cs, t, minus, observation)) / (2 * h);
-      worst = std::max(worst,
-                       (analytic.col(i) - numeric).norm() / std::max(1.0, analytic.col(i).norm()));
-    }
-  }
-  return worst;
-}
-
-TEST(TargetKinds, EveryKindHasARunTimeFormWithItsSizes) {
+TEST_F(TargetKinds, EveryKindHasARunTimeFormWithItsSizes) {
   std::mt19937 gen(11);
   VComputeSubject cs(SubjectWithEveryKind(6, gen));
   ASSERT_EQ(cs.NumTargets(), 6u + 1 + 4 + 3);
@@ -87,12 +37,11 @@ TEST(TargetKinds, EveryKindHasARunTimeFormWithItsSizes) {
   EXPECT_EQ(cs.NumTargetParams(), 0u);
 }
 
-TEST(TargetKinds, ValuesAndResidualsFollowTheParentsWorldPose) {
-  std::mt19937 gen(12);
-  const auto model = SubjectWithEveryKind(5, gen);
-  VComputeSubject cs(model);
-  const Eigen::VectorXd x = RandomState(cs.NumParams(), gen);
-  cs.Update(Span(x));
+TEST_F(TargetKinds, ValuesAndResidualsFollowTheParentsWorldPose) {
+  Build(12, [](std::mt19937& gen) { return SubjectWithEveryKind(5, gen); });
+  std::mt19937& gen = m_Gen;
+  VComputeSubject& cs = *m_pCs;
+  cs.Update(Span(m_X));
   const Eigen::Vector3d observed = RandomVector(gen, 200);
   double residual[12];
   for (std::uint32_t t = 0; t < cs.NumTargets(); ++t) {
@@ -136,7 +85,7 @@ TEST(TargetKinds, ValuesAndResidualsFollowTheParentsWorldPose) {
   }
 }
 
-TEST(TargetKinds, JacobiansOfEveryKindMatchFiniteDifferences) {
+TEST_F(TargetKinds, JacobiansOfEveryKindMatchFiniteDifferences) {
   std::mt19937 gen(13);
   for (std::uint32_t rotator : {0u, 1u})
     for (int subject = 0; subject < 3; ++subject) {
@@ -148,7 +97,7 @@ TEST(TargetKinds, JacobiansOfEveryKindMatchFiniteDifferences) {
     }
 }
 
-TEST(TargetKinds, ARigidBodyCountsOnlyItsPresentMembers) {
+TEST_F(TargetKinds, ARigidBodyCountsOnlyItsPresentMembers) {
   std::mt19937 gen(14);
   VComputeSubject cs(SubjectWithEveryKind(4, gen));
   auto& body = const_cast<VComputeRigidBody&>(
@@ -171,7 +120,7 @@ TEST(TargetKinds, ARigidBodyCountsOnlyItsPresentMembers) {
   EXPECT_EQ(body.NumResiduals(), 0u);
 }
 
-TEST(TargetKinds, UnboundTargetsNameTheirClass) {
+TEST_F(TargetKinds, UnboundTargetsNameTheirClass) {
   std::mt19937 gen(16);
   auto model = SubjectWithEveryKind(3, gen);
   for (std::uint32_t t = 3; t < model->NumTargets(); ++t)

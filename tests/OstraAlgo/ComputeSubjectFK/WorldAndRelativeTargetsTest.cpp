@@ -2,6 +2,7 @@
 // central finite differences, text round trip, reload and single-target evaluation.
 
 #include "RandomSubject.h"
+#include "TargetTestSupport.h"
 
 #include "OstraAlgo/ComputeSubjectFK/VComputeSubject.h"
 #include "OstraAlgo/KinematicAlgo/VCalibratedTargets.h"
@@ -44,35 +45,13 @@ std::shared_ptr<VSubjectCalibrated> Subject(int n, std::mt19937& gen) {
   return subject;
 }
 
-Eigen::VectorXd RandomState(std::uint32_t n, std::mt19937& gen) {
-  std::uniform_real_distribution<double> u(-2.5, 2.5);
-  Eigen::VectorXd x(n);
-  for (auto& v : x)
-    v = u(gen);
-  return x;
-}
+using WorldAndRelativeTargets = ComputeTargetFixture;
 
-ConstView Span(const Eigen::VectorXd& v) {
-  return {v.data(), size_t(v.size())};
-}
-
-// Values then residuals of target t at x.
-Eigen::VectorXd Outputs(VComputeSubject& cs, std::uint32_t t, const Eigen::VectorXd& x,
-                        const Eigen::VectorXd& observation) {
-  cs.Update(Span(x));
-  const IComputeTarget& target = cs.Target(t);
-  Eigen::VectorXd out(target.NumValues() + target.NumResiduals());
-  std::copy(target.Values().begin(), target.Values().end(), out.data());
-  target.Residual(Span(observation), View(out.data() + target.NumValues(), target.NumResiduals()));
-  return out;
-}
-
-TEST(WorldAndRelativeTargets, ValuesAndResidualsFollowTheWorldPoses) {
-  std::mt19937 gen(71);
-  const auto model = Subject(8, gen);
-  VComputeSubject cs(model);
-  const Eigen::VectorXd x = RandomState(cs.NumParams(), gen);
-  cs.Update(Span(x));
+TEST_F(WorldAndRelativeTargets, ValuesAndResidualsFollowTheWorldPoses) {
+  Build(71, [](std::mt19937& gen) { return Subject(8, gen); });
+  std::mt19937& gen = m_Gen;
+  VComputeSubject& cs = *m_pCs;
+  cs.Update(Span(m_X));
   const auto world = [&](std::uint32_t id, const Eigen::Vector3d& p) {
     std::uint32_t s = 0;
     while (cs.Segment(s).Segment().Identifier() != std::int32_t(id))
@@ -102,36 +81,15 @@ TEST(WorldAndRelativeTargets, ValuesAndResidualsFollowTheWorldPoses) {
   }
 }
 
-TEST(WorldAndRelativeTargets, JacobiansMatchCentralDifferences) {
+TEST_F(WorldAndRelativeTargets, JacobiansMatchCentralDifferences) {
   std::mt19937 gen(72);
-  double worst = 0.0;
   for (int trial = 0; trial < 4; ++trial) {
-    const auto model = Subject(9, gen);
-    VComputeSubject cs(model);
-    const Eigen::VectorXd x = RandomState(cs.NumParams(), gen);
-    for (std::uint32_t t = 9; t < cs.NumTargets(); ++t) {
-      const IComputeTarget& target = cs.Target(t);
-      const Eigen::VectorXd observation = RandomState(target.ObservationSize(), gen) * 50;
-      cs.UpdateSegments(Span(x), EChain);
-      Eigen::MatrixXd analytic(target.NumValues() + target.NumResiduals(), x.size());
-      target.ValueJacobian(analytic.topRows(target.NumValues()));
-      target.ResidualJacobian(Span(observation), analytic.bottomRows(target.NumResiduals()));
-      for (Eigen::Index i = 0; i < x.size(); ++i) {
-        const double h = 1e-6 * std::max(1.0, std::abs(x[i]));
-        Eigen::VectorXd plus = x, minus = x;
-        plus[i] += h;
-        minus[i] -= h;
-        const Eigen::VectorXd numeric =
-            (Outputs(cs, t, plus, observation) - Outputs(cs, t, minus, observation)) / (2 * h);
-        worst = std::max(worst, (analytic.col(i) - numeric).norm() /
-                                    std::max(1.0, analytic.col(i).norm()));
-      }
-    }
+    VComputeSubject cs(Subject(9, gen));
+    EXPECT_LT(WorstTargetJacobianError(cs, RandomState(cs.NumParams(), gen), gen, 9), 1e-6);
   }
-  EXPECT_LT(worst, 1e-6);
 }
 
-TEST(WorldAndRelativeTargets, TextReloadAndSingleTargetEvaluation) {
+TEST_F(WorldAndRelativeTargets, TextReloadAndSingleTargetEvaluation) {
   std::mt19937 gen(73);
   const auto model = Subject(6, gen);
   std::ostringstream out;
