@@ -147,7 +147,7 @@ bool VTargetPointDirection::Read(VTextReader& r) {
       !r.Count(rows, 3, "ResidualCov rows") || !r.Count(cols, 3, "ResidualCov columns"))
     return false;
   m_ResidualCovariance.resize(rows, cols);
-  return !(rows * cols) || ReadMatrix(r, "Values: ", rows, cols, m_ResidualCovariance);
+  return rows == 0 || cols == 0 || ReadMatrix(r, "Values: ", rows, cols, m_ResidualCovariance);
 }
 
 void VTargetOrientation::Write(std::ostream& o) const {
