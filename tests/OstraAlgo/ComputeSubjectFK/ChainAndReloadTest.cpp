@@ -91,7 +91,9 @@ TEST(TargetChain, ChainKeepsThePathAndCompactsItsParameters) {
     EXPECT_EQ(chain.back().Segment().Identifier(), std::int32_t(100 + t));
     std::vector<double> expected;
     for (size_t k = 0; k < chain.size(); ++k) {
-      if (k) EXPECT_EQ(chain[k].ParentIndex(), chain[k - 1].Index());
+      if (k) {
+        EXPECT_EQ(chain[k].ParentIndex(), chain[k - 1].Index());
+      }
       EXPECT_EQ(info->m_Offsets[k], expected.size());
       for (std::uint32_t i = 0; i < chain[k].NumParams(); ++i)
         expected.push_back(x[chain[k].FirstParam() + i]);
@@ -100,7 +102,9 @@ TEST(TargetChain, ChainKeepsThePathAndCompactsItsParameters) {
     std::uint32_t covered = 0;
     for (size_t r = 0; r < info->m_Runs.size(); ++r) {
       EXPECT_LT(info->m_Runs[r].first, info->m_Runs[r].second);
-      if (r) EXPECT_GT(info->m_Runs[r].first, info->m_Runs[r - 1].second); // touching runs merge
+      if (r) { // touching runs merge
+        EXPECT_GT(info->m_Runs[r].first, info->m_Runs[r - 1].second);
+      }
       covered += info->m_Runs[r].second - info->m_Runs[r].first;
     }
     EXPECT_EQ(covered, expected.size());

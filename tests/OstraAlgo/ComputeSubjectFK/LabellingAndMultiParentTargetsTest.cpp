@@ -352,8 +352,9 @@ TEST(WriteTargetsToModel, ACopyTakesBackEveryTargetsGeometryAndAReloadFollowsThe
     return !dynamic_cast<const ITargetRange*>(&t) && !dynamic_cast<const ITargetDescriptor*>(&t);
   };
   for (std::uint32_t t = 0; t < model->NumTargets(); ++t)
-    if (holdsAll(*model->Target(t)))
+    if (holdsAll(*model->Target(t))) {
       EXPECT_TRUE(copy->Target(t)->Equals(*model->Target(t))) << t << model->Target(t)->Key();
+    }
 
   // The other way round: the model takes the other geometry, a reload follows it, and what the
   // reloaded subject writes back is that geometry.
@@ -373,8 +374,9 @@ TEST(WriteTargetsToModel, ACopyTakesBackEveryTargetsGeometryAndAReloadFollowsThe
   const auto written = std::static_pointer_cast<VSubjectCalibrated>(other->Clone());
   ASSERT_TRUE(cs.WriteToModel(*written, WithTargets));
   for (std::uint32_t t = 0; t < model->NumTargets(); ++t)
-    if (holdsAll(*model->Target(t)))
+    if (holdsAll(*model->Target(t))) {
       EXPECT_TRUE(written->Target(t)->Equals(*model->Target(t))) << t;
+    }
 }
 
 TEST(WriteTargetsToModel, AModelWithOtherTargetsIsRefusedUntouched) {
