@@ -189,10 +189,10 @@ bool NestsDeeperThan(const char* pText, std::size_t limit) {
         ++p;
         break;
       }
+      // Values are most of a tag's text: jump over them whole.
       const char quote = *p++;
-      while (*p && *p != quote)
-        ++p;
-      if (*p == '\0') return false;
+      p = static_cast<const char*>(std::memchr(p, quote, static_cast<std::size_t>(end - p)));
+      if (!p) return false;
       ++p;
     }
   }

@@ -77,7 +77,9 @@ public:
 
 private:
   struct VDeclaration {
-    std::string m_Name;
+    // Declared names are short (the longest are some 40 characters): kept inline, off the heap.
+    boost::container::small_vector<char, 48> m_NameText;
+    std::string_view Name() const { return {m_NameText.data(), m_NameText.size()}; }
     std::int32_t m_MinOccurs;
     std::int32_t m_MaxOccurs;
     IVersion m_Lower;

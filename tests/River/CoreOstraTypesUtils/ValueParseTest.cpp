@@ -103,4 +103,20 @@ TEST(ValueParse, PlainNumbersReadAsTheGrammarReadsThem) {
     }
     ExpectSame(factory, buffer);
   }
+  // Short decimals, as files hold them, convert without strtod: at most 15 digits anywhere
+  // around the point, the limit of 15 and just past it, and the forms of zero.
+  for (int i = 0; i < 20000; ++i) {
+    const int digits = 1 + static_cast<int>(random() % 16);
+    const int point = static_cast<int>(random() % static_cast<unsigned>(digits + 1));
+    std::string text = random() % 2 ? "-" : "";
+    for (int d = 0; d < digits; ++d) {
+      if (d == point) text += '.';
+      text += static_cast<char>('0' + random() % 10);
+    }
+    if (random() % 4 == 0) text += '.';
+    ExpectSame(factory, text);
+  }
+  for (const char* text : {"0", "-0", "-0.0", ".5", "-.5", "5.", "999999999999999",
+                           "0.000000000000001", "-99999999999999.9", "1234567890123456"})
+    ExpectSame(factory, text);
 }
