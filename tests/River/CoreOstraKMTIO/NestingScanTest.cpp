@@ -41,6 +41,17 @@ TEST(NestingScan, QuotedValuesHideMarkup) {
   EXPECT_TRUE(NestsDeeperThan(longValue.c_str(), 4));
 }
 
+TEST(NestingScan, FindsQuotesAndEndsAnywhereInALongTag) {
+  // Tags scanned in blocks: the quote, the '>' and the '/' before it fall at every offset.
+  for (std::size_t pad = 0; pad < 40; ++pad) {
+    const std::string blanks(pad, ' ');
+    const std::string text = "<A" + blanks + " V='<X><Y><Z>'" + blanks + " W=\"<P><Q>\"" + blanks +
+                             "><B" + blanks + "/><C" + blanks + "/></A>";
+    EXPECT_FALSE(NestsDeeperThan(text.c_str(), 2)) << pad;
+    EXPECT_TRUE(NestsDeeperThan(text.c_str(), 1)) << pad;
+  }
+}
+
 TEST(NestingScan, TruncatedTextEndsTheScan) {
   // An open quote or tag at the end stops the scan without reading past the text.
   EXPECT_FALSE(NestsDeeperThan("<A><B V=\"<C><D><E>", 2));
