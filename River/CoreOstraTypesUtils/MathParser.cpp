@@ -1,5 +1,6 @@
 #include "River/CoreOstraTypesUtils/MathParser.h"
 
+#include "River/CoreOstraTypesUtils/ExpressionNumber.h"
 #include "River/CoreOstraTypesUtils/VMathFactorySimple.h"
 
 #include <cctype>
@@ -411,34 +412,24 @@ bool ParseWith(TBuilder& builder, const std::string& text, typename TBuilder::Va
 /// A number alone, perhaps negated ("12", "-0.5"): the grammar reads it as ReadNumberText's value
 /// of the digits, negated. False for anything else.
 bool ReadPlainNumber(const std::string& text, double& o_rValue) {
-  static constexpr double powersOfTen[] = {1e0, 1e1, 1e2,  1e3,  1e4,  1e5,  1e6,  1e7,
-                                           1e8, 1e9, 1e10, 1e11, 1e12, 1e13, 1e14, 1e15};
   const std::size_t start = !text.empty() && text[0] == '-' ? 1 : 0;
-  bool point = false;
-  int digits = 0, fractionDigits = 0;
-  std::uint64_t mantissa = 0;
-  for (std::size_t i = start; i < text.size(); ++i) {
-    if (IsDigit(text[i])) {
-      ++digits;
-      if (digits <= 15) mantissa = mantissa * 10 + static_cast<std::uint64_t>(text[i] - '0');
-      if (point) ++fractionDigits;
-    } else if (text[i] == '.' && !point) {
-      point = true;
-    } else {
-      return false;
+  double value = 0.0;
+  if (!ReadShortDecimal(std::string_view(text).substr(start), value)) {
+    bool digit = false, point = false;
+    for (std::size_t i = start; i < text.size(); ++i) {
+      if (IsDigit(text[i])) {
+        digit = true;
+      } else if (text[i] == '.' && !point) {
+        point = true;
+      } else {
+        return false;
+      }
     }
+    if (!digit) return false;
+    char* end = nullptr;
+    value = std::strtod(text.c_str() + start, &end);
+    if (end != text.c_str() + text.size()) return false;
   }
-  if (digits == 0) return false;
-  if (digits <= 15) {
-    // Up to 15 digits the integer is exact, and one division by an exact power of ten rounds
-    // once: the value strtod gives, without its cost.
-    const double value = static_cast<double>(mantissa) / powersOfTen[fractionDigits];
-    o_rValue = start ? -value : value;
-    return true;
-  }
-  char* end = nullptr;
-  const double value = std::strtod(text.c_str() + start, &end);
-  if (end != text.c_str() + text.size()) return false;
   o_rValue = start ? -value : value;
   return true;
 }

@@ -26,6 +26,8 @@ unsigned KeySlot(std::uint32_t key) {
 VReaderNode::VReaderNode(rapidxml::xml_document<>& document, bool strictSequence)
     : m_pNode(&document), m_pInfo(std::make_shared<VGlobalInfo>()) {
   m_pInfo->m_StrictSequence = strictSequence;
+  // Room for the IDs of a sizeable document at once, rather than a rehash at every doubling.
+  m_pInfo->m_Ids.reserve(256);
 }
 
 VReaderNode::VReaderNode(rapidxml::xml_node<>* node, std::shared_ptr<VGlobalInfo> info,
@@ -91,7 +93,7 @@ bool VReaderNode::Attribute(std::string_view name, std::string& o_rValue,
   return true;
 }
 
-std::size_t VReaderNode::FindAttribute(std::string_view name) {
+inline std::size_t VReaderNode::FindAttribute(std::string_view name) {
   // Declaring a name visits every attribute of that name; the first one is the value.
   if (!m_AttributesListed) ListAttributes();
   const std::uint32_t key = NameKey(name);
@@ -131,7 +133,7 @@ bool VReaderNode::AttributeText(std::string_view name, std::string_view& o_rValu
     return false;
   }
   const std::string_view value = NodeValue(m_Attributes[index].m_pAttribute);
-  if (type.size() >= 6 && type.substr(0, 6) == "xsd:ID") CheckId(type, value);
+  if (type.starts_with("xsd:ID")) CheckId(type, value);
   o_rValue = value;
   return true;
 }
