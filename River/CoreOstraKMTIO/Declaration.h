@@ -17,6 +17,7 @@
 #include <string>
 #include <string_view>
 #include <unordered_map>
+#include <unordered_set>
 
 namespace CoreOstraKMTIO::Detail {
 
@@ -55,6 +56,15 @@ struct VReadContext {
   };
   mutable VNameIndex m_SegmentNames{};
   mutable VNameIndex m_MarkerNames{};
+
+  /// Whether a marker read so far has this ID hash.
+  bool HasMarkerId(std::uint32_t id) const;
+  /// The ID hashes of the first m_Count markers, extended as markers are added.
+  struct VIdIndex {
+    std::unordered_set<std::uint32_t> m_Ids;
+    std::size_t m_Count = 0;
+  };
+  mutable VIdIndex m_MarkerIds{};
 };
 
 /// The document: one KinematicModel.

@@ -62,12 +62,9 @@ void DeclareMarker(INode& node, VReadContext& context) {
 
   ReadString(node, "NAME", marker.m_Name, "The name of this marker", XsdId, true);
   marker.m_MarkerId = CoreOstraTypes::NameHash(marker.m_Name);
-  for (const auto& other : subject.m_Markers) {
-    if (other.m_MarkerId == marker.m_MarkerId) {
-      node.Error(
-          ZMT::FormatOrRaw("Marker %1% has encountered an ID hash collision", marker.m_Name));
-      return;
-    }
+  if (context.HasMarkerId(marker.m_MarkerId)) {
+    node.Error(ZMT::FormatOrRaw("Marker %1% has encountered an ID hash collision", marker.m_Name));
+    return;
   }
   std::string segmentName;
   if (ReadString(node, "SEGMENT", segmentName, "The segment to which this marker is attached",

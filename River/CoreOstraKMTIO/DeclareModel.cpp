@@ -37,6 +37,15 @@ std::optional<std::uint32_t> VReadContext::FindMarker(const std::string& name) c
   return FindByName(m_rSubject.m_Markers, m_MarkerNames, name);
 }
 
+bool VReadContext::HasMarkerId(std::uint32_t id) const {
+  const auto& markers = m_rSubject.m_Markers;
+  if (markers.size() < m_MarkerIds.m_Count) m_MarkerIds = {};
+  if (m_MarkerIds.m_Ids.empty()) m_MarkerIds.m_Ids.reserve(256);
+  for (; m_MarkerIds.m_Count < markers.size(); ++m_MarkerIds.m_Count)
+    m_MarkerIds.m_Ids.insert(markers[m_MarkerIds.m_Count].m_MarkerId);
+  return m_MarkerIds.m_Ids.count(id) != 0;
+}
+
 void VReadContext::DropSegmentsFrom(std::uint32_t index) {
   m_rSubject.m_Segments.resize(index);
   m_rAppData.m_Segments.resize(index);

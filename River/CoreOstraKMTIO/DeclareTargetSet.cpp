@@ -25,28 +25,24 @@ struct VTargetElement {
   EKind m_Kind;
   const char* m_pDocumentation;
   IVersion m_Lower;
+  const char* m_pTemplateName; ///< its template child, for the kinds that have one
 };
 
 const VTargetElement TargetElements[] = {
     {"TargetLocalLineToWorldPoint", EKind::ELine, "A target mapping a local line to a world point",
-     None},
+     None, "TargetLocalLineToWorldPointTemplate"},
     {"TargetLocalPlaneToWorldPoint", EKind::EPlane,
-     "A target mapping a local plane to a world point", None},
+     "A target mapping a local plane to a world point", None,
+     "TargetLocalPlaneToWorldPointTemplate"},
     {"TargetLocalPointToWorldPoint", EKind::EPoint, "A simple marker attached to a parent segment",
-     None},
+     None, "TargetLocalPointToWorldPointTemplate"},
     {"TargetRigidBody", EKind::ERigidBody,
-     "Defines a rigid cluster of markers attached to a segment", None},
+     "Defines a rigid cluster of markers attached to a segment", None, nullptr},
     {"TargetLocalRotationToWorldRotation", EKind::ERotation,
-     "Align a segment with a world orientation", None},
+     "Align a segment with a world orientation", None, nullptr},
     {"TargetLocalDirectionToWorldDirection", EKind::EDirection,
-     "Align a segment to a direction constraint", V3_5},
+     "Align a segment to a direction constraint", V3_5, nullptr},
 };
-
-EKind KindOfElement(const std::string& name) {
-  for (const auto& element : TargetElements)
-    if (name == element.m_pName) return element.m_Kind;
-  return EKind::EPoint;
-}
 
 VTargetType PlainType(EKind kind, bool gaussian) {
   switch (kind) {
@@ -196,10 +192,9 @@ void ReadRotationAxes(INode& node, VTarget& io_rTarget, const std::string& targe
   io_rTarget.m_RotationTargetOrientation.assign(orientation.begin(), orientation.end());
 }
 
-void DeclareTarget(INode& node, VReadContext& context) {
+void DeclareTarget(INode& node, VReadContext& context, const VTargetElement& element) {
   const auto errors = node.ErrorCount();
-  const std::string element = node.Name();
-  const EKind kind = KindOfElement(element);
+  const EKind kind = element.m_Kind;
   const bool marked = kind == EKind::EPoint || kind == EKind::ELine || kind == EKind::EPlane;
   VTarget target;
   target.m_Type = PlainType(kind, false);
@@ -305,7 +300,7 @@ void DeclareTarget(INode& node, VReadContext& context) {
   }
 
   if (marked) {
-    node.Child(element + "Template", "Stores the skeleton template", 1, 1);
+    node.Child(element.m_pTemplateName, "Stores the skeleton template", 1, 1);
     node.Children([&target, kind](INode& child) {
       ReadNumberList(child, "COVARIANCE", target.m_TemplateCovariance, AnyCount,
                      TemplateDocumentation(kind));
@@ -352,7 +347,8 @@ void DeclareTargetSet(INode& node, VReadContext& context) {
   node.Children([&context](INode& targets) {
     for (const auto& element : TargetElements) {
       targets.Child(element.m_pName, element.m_pDocumentation, 0, -1, element.m_Lower);
-      targets.Children([&context](INode& child) { DeclareTarget(child, context); });
+      targets.Children(
+          [&context, &element](INode& child) { DeclareTarget(child, context, element); });
     }
   });
 }

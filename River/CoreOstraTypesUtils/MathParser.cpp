@@ -1,5 +1,6 @@
 #include "River/CoreOstraTypesUtils/MathParser.h"
 
+#include "River/CoreOstraTypesUtils/ExpressionNumber.h"
 #include "River/CoreOstraTypesUtils/VMathFactorySimple.h"
 
 #include <cctype>
@@ -412,20 +413,23 @@ bool ParseWith(TBuilder& builder, const std::string& text, typename TBuilder::Va
 /// of the digits, negated. False for anything else.
 bool ReadPlainNumber(const std::string& text, double& o_rValue) {
   const std::size_t start = !text.empty() && text[0] == '-' ? 1 : 0;
-  bool digit = false, point = false;
-  for (std::size_t i = start; i < text.size(); ++i) {
-    if (IsDigit(text[i])) {
-      digit = true;
-    } else if (text[i] == '.' && !point) {
-      point = true;
-    } else {
-      return false;
+  double value = 0.0;
+  if (!ReadShortDecimal(std::string_view(text).substr(start), value)) {
+    bool digit = false, point = false;
+    for (std::size_t i = start; i < text.size(); ++i) {
+      if (IsDigit(text[i])) {
+        digit = true;
+      } else if (text[i] == '.' && !point) {
+        point = true;
+      } else {
+        return false;
+      }
     }
+    if (!digit) return false;
+    char* end = nullptr;
+    value = std::strtod(text.c_str() + start, &end);
+    if (end != text.c_str() + text.size()) return false;
   }
-  if (!digit) return false;
-  char* end = nullptr;
-  const double value = std::strtod(text.c_str() + start, &end);
-  if (end != text.c_str() + text.size()) return false;
   o_rValue = start ? -value : value;
   return true;
 }

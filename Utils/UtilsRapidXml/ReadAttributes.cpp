@@ -63,24 +63,26 @@ template <class F> bool ScanNumbers(std::string_view text, VNumbers& o_rValues, 
     const char* const start = p;
     const bool negative = *p == '-';
     if (negative) ++p;
+    // Integer digits, then a point and fraction digits; anything else in the token makes it
+    // not plain, and the token is then skipped to its end.
     std::uint64_t mantissa = 0;
-    int digits = 0, fractionDigits = -1; // -1 until the point
+    int digits = 0, fractionDigits = 0;
+    for (; p < end && static_cast<unsigned>(*p - '0') < 10u; ++p, ++digits)
+      mantissa = mantissa * 10 + static_cast<std::uint64_t>(*p - '0');
+    if (p < end && *p == '.') {
+      for (++p; p < end && static_cast<unsigned>(*p - '0') < 10u; ++p, ++fractionDigits)
+        mantissa = mantissa * 10 + static_cast<std::uint64_t>(*p - '0');
+      digits += fractionDigits;
+    }
     bool plain = true;
-    for (; p < end && !IsBlank(*p); ++p) {
-      const char c = *p;
-      if (c >= '0' && c <= '9') {
-        mantissa = mantissa * 10 + static_cast<std::uint64_t>(c - '0');
-        ++digits;
-        if (fractionDigits >= 0) ++fractionDigits;
-      } else if (c == '.' && fractionDigits < 0) {
-        fractionDigits = 0;
-      } else {
-        plain = false;
-      }
+    if (p < end && !IsBlank(*p)) {
+      plain = false;
+      while (p < end && !IsBlank(*p))
+        ++p;
     }
     double value = 0.0;
     if (plain && digits > 0 && digits <= 15) {
-      value = static_cast<double>(mantissa) / powersOfTen[fractionDigits < 0 ? 0 : fractionDigits];
+      value = static_cast<double>(mantissa) / powersOfTen[fractionDigits];
       if (negative) value = -value;
     } else if (parsed &&
                !parse(std::string_view(start, static_cast<std::size_t>(p - start)), value)) {

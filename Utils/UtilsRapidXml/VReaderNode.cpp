@@ -26,6 +26,8 @@ unsigned KeySlot(std::uint32_t key) {
 VReaderNode::VReaderNode(rapidxml::xml_document<>& document, bool strictSequence)
     : m_pNode(&document), m_pInfo(std::make_shared<VGlobalInfo>()) {
   m_pInfo->m_StrictSequence = strictSequence;
+  // Room for the IDs of a sizeable document at once, rather than a rehash at every doubling.
+  m_pInfo->m_Ids.reserve(256);
 }
 
 VReaderNode::VReaderNode(rapidxml::xml_node<>* node, std::shared_ptr<VGlobalInfo> info,
@@ -58,8 +60,10 @@ const std::string& VReaderNode::Path() const {
 
 void VReaderNode::ReportUnvisited() {
   if (m_Abandoned) return;
+  // Nearly always every attribute was declared: then there is nothing to walk.
+  const bool allVisited = m_AttributesListed && m_VisitedAttributes.AllBelow(m_Attributes.size());
   std::size_t index = 0;
-  for (auto* attribute = m_pNode->first_attribute(); attribute;
+  for (auto* attribute = allVisited ? nullptr : m_pNode->first_attribute(); attribute;
        attribute = attribute->next_attribute(), ++index) {
     if (!m_VisitedAttributes.Test(index)) {
       const std::string key = Path() + "/" + std::string(NodeName(attribute));
@@ -89,7 +93,7 @@ bool VReaderNode::Attribute(std::string_view name, std::string& o_rValue,
   return true;
 }
 
-std::size_t VReaderNode::FindAttribute(std::string_view name) {
+inline std::size_t VReaderNode::FindAttribute(std::string_view name) {
   // Declaring a name visits every attribute of that name; the first one is the value.
   if (!m_AttributesListed) ListAttributes();
   const std::uint32_t key = NameKey(name);
@@ -129,7 +133,7 @@ bool VReaderNode::AttributeText(std::string_view name, std::string_view& o_rValu
     return false;
   }
   const std::string_view value = NodeValue(m_Attributes[index].m_pAttribute);
-  if (type.size() >= 6 && type.substr(0, 6) == "xsd:ID") CheckId(type, value);
+  if (type.starts_with("xsd:ID")) CheckId(type, value);
   o_rValue = value;
   return true;
 }
@@ -177,7 +181,7 @@ void VReaderNode::ListAttributes() {
 
 void VReaderNode::Child(std::string_view name, std::string_view, std::int32_t minOccurs,
                         std::int32_t maxOccurs, const IVersion& lower, const IVersion& upper) {
-  m_Declarations.push_back({std::string(name), minOccurs, maxOccurs, lower, upper});
+  m_Declarations.push_back({{name.begin(), name.end()}, minOccurs, maxOccurs, lower, upper});
 }
 
 void VReaderNode::MatchDeclaration(const VDeclaration& declaration, bool choice,
@@ -185,16 +189,16 @@ void VReaderNode::MatchDeclaration(const VDeclaration& declaration, bool choice,
   std::int64_t count = 0;
   std::size_t position = 0;
   for (auto* child = m_pNode->first_node(); child; child = child->next_sibling(), ++position) {
-    if (child->type() != rapidxml::node_element || NodeName(child) != declaration.m_Name) continue;
+    if (child->type() != rapidxml::node_element || NodeName(child) != declaration.Name()) continue;
     m_VisitedElements.Set(position);
     if (IsOutOfRange(m_pInfo->m_Version, declaration.m_Lower, declaration.m_Upper)) {
       Warning(ZMT::FormatOrRaw("Ignoring %1% element. Not supported in files with version %2%",
-                               declaration.m_Name, m_pInfo->m_Version.ToString()));
+                               std::string(declaration.Name()), m_pInfo->m_Version.ToString()));
       continue;
     }
     if (m_pInfo->m_StrictSequence && position < m_LastPosition) {
       Error(ZMT::FormatOrRaw("%1% element did not appear in correct element sequence",
-                             declaration.m_Name));
+                             std::string(declaration.Name())));
       continue;
     }
     m_LastPosition = position;
@@ -202,22 +206,22 @@ void VReaderNode::MatchDeclaration(const VDeclaration& declaration, bool choice,
       ++count;
       if (declaration.m_MaxOccurs >= 1 && count > declaration.m_MaxOccurs) {
         Error(ZMT::FormatOrRaw("%1% element must have a maximum of %2% %3% child elements", Path(),
-                               declaration.m_MaxOccurs, declaration.m_Name));
+                               declaration.m_MaxOccurs, std::string(declaration.Name())));
         continue;
       }
     } else {
-      if (!io_rChoiceName.empty() && io_rChoiceName != declaration.m_Name) {
+      if (!io_rChoiceName.empty() && io_rChoiceName != declaration.Name()) {
         Error(ZMT::FormatOrRaw("%1% element cannot have both a %2% and a %3% child element", Path(),
-                               io_rChoiceName, declaration.m_Name));
+                               io_rChoiceName, std::string(declaration.Name())));
         continue;
       }
-      io_rChoiceName = declaration.m_Name;
+      io_rChoiceName = declaration.Name();
     }
     io_rAccepted.push_back({position, child});
   }
   if (!choice && count < declaration.m_MinOccurs) {
     Error(ZMT::FormatOrRaw("%1% element must have a minimum of %2% %3% child elements", Path(),
-                           declaration.m_MinOccurs, declaration.m_Name));
+                           declaration.m_MinOccurs, std::string(declaration.Name())));
   }
 }
 
@@ -236,7 +240,7 @@ void VReaderNode::Children(Handler handler, bool choice) {
     std::string message =
         ZMT::FormatOrRaw("%1% element must have a one of the following child elements:", Path());
     for (const auto& declaration : declarations)
-      message += " " + declaration.m_Name;
+      message.append(1, ' ').append(declaration.Name());
     Error(message);
   }
   // One declaration's children come in document order already; only several need the sort.

@@ -77,7 +77,9 @@ public:
 
 private:
   struct VDeclaration {
-    std::string m_Name;
+    // Declared names are short (the longest are some 40 characters): kept inline, off the heap.
+    boost::container::small_vector<char, 48> m_NameText;
+    std::string_view Name() const { return {m_NameText.data(), m_NameText.size()}; }
     std::int32_t m_MinOccurs;
     std::int32_t m_MaxOccurs;
     IVersion m_Lower;
@@ -102,7 +104,8 @@ private:
   void ListAttributes();
   static constexpr std::size_t NoAttribute = ~std::size_t{0};
   /// Marks every attribute named `name` visited; the position of the first, or NoAttribute.
-  std::size_t FindAttribute(std::string_view name);
+  /// Inlined into AttributeText, its one caller, which runs for every declared attribute.
+  [[gnu::always_inline]] inline std::size_t FindAttribute(std::string_view name);
   // The messages, kept out of the lookup's way.
   [[gnu::noinline, gnu::cold]] void ReportOutOfVersion(std::string_view name);
   [[gnu::noinline, gnu::cold]] void ReportMissing(std::string_view name);

@@ -26,6 +26,19 @@ public:
     return index < m_More.size() && m_More[index];
   }
 
+  /// Whether every index below `count` is set.
+  bool AllBelow(std::size_t count) const {
+    if (count <= WordBits) {
+      const std::uint64_t mask =
+          count == WordBits ? ~std::uint64_t{0} : (std::uint64_t{1} << count) - 1;
+      return (m_Word & mask) == mask;
+    }
+    if (~m_Word != 0 || m_More.size() < count - WordBits) return false;
+    return std::all_of(m_More.begin(),
+                       m_More.begin() + static_cast<std::ptrdiff_t>(count - WordBits),
+                       [](bool set) { return set; });
+  }
+
 private:
   static constexpr std::size_t WordBits = 64;
   std::uint64_t m_Word = 0;

@@ -103,4 +103,37 @@ TEST(ValueParse, PlainNumbersReadAsTheGrammarReadsThem) {
     }
     ExpectSame(factory, buffer);
   }
+  // Short decimals, as files hold them, convert without strtod, alone and as the grammar's
+  // numbers: at most 15 digits anywhere around the point, the limit and just past it, and the
+  // forms of zero, to strtod's value bit for bit.
+  auto expectStrtod = [&factory](const std::string& text) {
+    ExpectSame(factory, text);
+    const bool negative = text[0] == '-';
+    char* end = nullptr;
+    const double digits = std::strtod(text.c_str() + (negative ? 1 : 0), &end);
+    if (*end != '\0') return; // not a number: ExpectSame has checked the refusal
+    const double expected = negative ? -digits : digits;
+    double alone = 0.0, inSum = 0.0, number = 0.0;
+    std::string message;
+    ASSERT_TRUE(ParseValue(factory, text, alone, message, ',')) << text;
+    ASSERT_TRUE(ParseValue(factory, "0+" + text, inSum, message, ',')) << text;
+    ASSERT_TRUE(ReadNumberText(text.substr(negative ? 1 : 0), number)) << text;
+    EXPECT_EQ(std::memcmp(&alone, &expected, sizeof(double)), 0) << text;
+    EXPECT_EQ(inSum, 0.0 + expected) << text;
+    EXPECT_EQ(std::memcmp(&number, &digits, sizeof(double)), 0) << text;
+  };
+  for (int i = 0; i < 20000; ++i) {
+    const int digits = 1 + static_cast<int>(random() % 16);
+    const int point = static_cast<int>(random() % static_cast<unsigned>(digits + 1));
+    std::string text = random() % 2 ? "-" : "";
+    for (int d = 0; d < digits; ++d) {
+      if (d == point) text += '.';
+      text += static_cast<char>('0' + random() % 10);
+    }
+    if (random() % 4 == 0) text += '.';
+    expectStrtod(text);
+  }
+  for (const char* text : {"0", "-0", "-0.0", ".5", "-.5", "5.", "999999999999999",
+                           "0.000000000000001", "-99999999999999.9", "1234567890123456"})
+    expectStrtod(text);
 }

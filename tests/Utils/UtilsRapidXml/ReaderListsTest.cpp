@@ -226,6 +226,26 @@ TEST(ReaderLists, ManyAttributesWithSharedKeysAndRepeatedNames) {
     EXPECT_EQ(run.m_Warnings, expected);
   }
 
+  // Every attribute declared but one, which lies past the first word of marks or in it: only
+  // that one is reported; every one declared: nothing is.
+  for (const int count : {64, 65, 70}) {
+    std::string xml = "<E";
+    for (int i = 0; i < count; ++i)
+      xml += " A" + std::to_string(i) + "=\"\"";
+    xml += "/>";
+    for (const int skipped : {count - 1, 3, -1}) {
+      const auto run = ReadElement(xml, [&](INode& node) {
+        std::string value;
+        for (int i = 0; i < count; ++i)
+          if (i != skipped) node.Attribute("A" + std::to_string(i), value, "", "", true);
+      });
+      std::vector<std::string> expected;
+      if (skipped >= 0)
+        expected.push_back("Ignoring unrecognised attribute: /E/A" + std::to_string(skipped));
+      EXPECT_EQ(run.m_Warnings, expected) << count << " " << skipped;
+    }
+  }
+
   // A short element takes the table: a repeated name is visited twice, and its first value read.
   std::string first;
   const auto twice = ReadElement(R"(<E N="1" M="x" N="2"/>)",
