@@ -12,8 +12,6 @@ namespace {
 constexpr std::uint64_t FirstTable = 40;
 constexpr std::uint64_t SecondTable = 60;
 constexpr std::uint64_t AfterTables = 80;
-/// Chunk positions remembered for references before the memory is given back.
-constexpr std::size_t MaxKnown = 1 << 18;
 
 std::string At(std::uint64_t position) {
   return " at byte " + std::to_string(position);
@@ -34,7 +32,7 @@ void VReader::Close() {
   m_Index.clear();
   m_Sessions.clear();
   m_ScanSession = VSessionInfo();
-  m_Known.clear();
+  m_Known.Clear();
   m_Problems.clear();
 }
 
@@ -363,8 +361,7 @@ IResult VReader::ReadBody(std::uint64_t position, std::uint64_t size, const VFil
     result = IResult::FailedWithException;
   }
   if (result.IsSuccess() && o_rItem) {
-    if (m_Known.size() >= MaxKnown) m_Known.clear();
-    m_Known[position] = o_rItem.GetToken();
+    m_Known.Record(position, o_rItem.GetToken());
   }
   return result;
 }
@@ -386,8 +383,8 @@ IResult VReader::ReadReferenced(std::uint64_t position, std::uint32_t typeId,
     return IResult::InvalidFormat;
   }
   const std::uint64_t body = position + Format::ChunkHeaderSize + fixed;
-  auto known = m_Known.find(body);
-  if (known != m_Known.end() && m_Store->FindItem(known->second, o_rItem).IsSuccess())
+  ZMT::IFlowItemToken known;
+  if (m_Known.Find(body, known) && m_Store->FindItem(known, o_rItem).IsSuccess())
     return IResult::Ok;
   if (header.m_PayloadSize < fixed) return IResult::InvalidFormat;
   if (fixed == 4) {

@@ -8,6 +8,7 @@
 // still reads, and each problem is described in GetProblems. One thread drives a reader.
 
 #include "Flow2/Flow2File/FlowFileFormat.h"
+#include "Flow2/Flow2File/VKnownPositions.h"
 #include "Flow2/Flow2Types/IFlowBuffer.h"
 #include "Flow2/Flow2Types/IFlowState.h"
 #include "Flow2/Flow2Types/IFlowStore.h"
@@ -114,7 +115,7 @@ private:
   VSessionInfo m_ScanSession;
   std::uint64_t m_LastIndexed = 0;
   /// Tokens of item chunks read lately, so that a reference to one finds the item in the store.
-  std::unordered_map<std::uint64_t, ZMT::IFlowItemToken> m_Known;
+  VKnownPositions m_Known;
   std::vector<std::string> m_Problems;
 };
 
