@@ -486,26 +486,41 @@ IResult VReader::ReadState(std::size_t index, ZMT::IFlowStateHandle& o_rState) {
       if (!ReadAt(groupEnd, m_Bodies.data(), bodySize))
         return damaged("an item group is cut short");
       std::uint64_t offset = 0;
+      // Items at the state's time are moved in as a group, without a reference count each.
+      const bool atStateTime = itemTime == time;
+      m_GroupItems.clear();
+      auto addGroup = [&] {
+        if (!m_GroupItems.empty()) o_rState->AddItems(std::move(m_GroupItems));
+        m_GroupItems.clear();
+      };
       for (std::uint32_t i = 0; i < groupCount; ++i) {
         ++m_ChunksRead;
-        if (bodySize - offset < Format::ChunkHeaderSize + 4)
+        if (bodySize - offset < Format::ChunkHeaderSize + 4) {
+          addGroup();
           return damaged("an item is missing or damaged");
+        }
         header.Decode(m_Bodies.data() + offset);
         if (header.m_Type != std::uint16_t(EChunkType::ItemData) || header.m_PayloadSize < 4 ||
-            header.m_PayloadSize > bodySize - offset - Format::ChunkHeaderSize)
+            header.m_PayloadSize > bodySize - offset - Format::ChunkHeaderSize) {
+          addGroup();
           return damaged("an item is missing or damaged");
+        }
         ZMT::IFlowItemToken token(0, typeId, flowStoreId);
         std::memcpy(&token.m_ItemId, m_Bodies.data() + offset + Format::ChunkHeaderSize, 4);
         const std::uint64_t body = offset + Format::ChunkHeaderSize + 4;
         ZMT::IFlowItemHandle item;
         if (ReadBody(groupEnd + body, header.m_PayloadSize - 4, *pType, token, item,
                      m_Bodies.data() + body)
-                .IsFailure() ||
-            !o_rState->AddItem(item, itemTime))
+                .IsFailure())
+          partial = true;
+        else if (atStateTime)
+          m_GroupItems.push_back(std::move(item));
+        else if (!o_rState->AddItem(item, itemTime))
           partial = true;
         offset += Format::ChunkHeaderSize + header.m_PayloadSize;
         position = groupEnd + offset;
       }
+      addGroup();
       if (offset != bodySize) return damaged("item bodies don't match their group's size");
     }
     read += groupCount;

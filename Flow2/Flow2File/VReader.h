@@ -107,6 +107,8 @@ private:
   std::vector<std::uint8_t> m_Payload;
   /// The item chunks of one group.
   std::vector<std::uint8_t> m_Bodies;
+  /// The items of one group at the state's own time, moved into the state together.
+  ZMT::VItemHandles m_GroupItems;
   std::map<std::uint32_t, VFileType> m_Types;
   std::vector<std::uint64_t> m_TypePositions;
   std::vector<std::uint64_t> m_StaticPositions;
