@@ -24,6 +24,7 @@ VReader::VReader(ZMT::IFlowStoreHandle store, ZMT::IFlowBufferFactoryHandle buff
 
 void VReader::Close() {
   m_pStream = nullptr;
+  m_pMapped = nullptr;
   m_Start = m_Size = m_ChunksRead = m_LastIndexed = 0;
   m_Complete = false;
   m_Types.clear();
@@ -40,6 +41,14 @@ bool VReader::ReadAt(std::uint64_t position, void* o_pData, std::uint64_t size) 
   if (position > m_Size || size > m_Size - position) return false;
   return m_pStream->Seek(static_cast<std::int64_t>(m_Start + position)) &&
          m_pStream->Read(o_pData, size);
+}
+
+const std::uint8_t* VReader::View(std::uint64_t position, std::uint64_t size) {
+  if (!m_pMapped || position > m_Size || size > m_Size - position ||
+      !m_pMapped->Seek(static_cast<std::int64_t>(m_Start + position)))
+    return nullptr;
+  const std::uint8_t* pData = nullptr;
+  return m_pMapped->Stream().GetContiguous(pData) >= size ? pData : nullptr;
 }
 
 bool VReader::ReadHeader(std::uint64_t position, VChunkHeader& o_rHeader) {
@@ -63,6 +72,8 @@ IResult VReader::Open(ZMT::IInputStreamSeekable* i_pStream) {
   Close();
   if (!i_pStream) return IResult::InvalidPointer;
   m_pStream = i_pStream;
+  m_pMapped = dynamic_cast<UtilsFileSystem::IInputStreamSeekableOwningAdapter<
+      UtilsFileSystem::VMemoryMappedInputStream>*>(i_pStream);
   std::uint64_t total = 0;
   if (!m_pStream->GetPosition(m_Start) || !m_pStream->GetSize(total) || total < m_Start) {
     Close();
@@ -482,9 +493,13 @@ IResult VReader::ReadState(std::size_t index, ZMT::IFlowStateHandle& o_rState) {
       // The group's items are read in one piece and taken apart in memory.
       position = groupEnd;
       if (bodySize > m_Size - groupEnd) return damaged("the file ends inside an item group");
-      m_Bodies.resize(bodySize);
-      if (!ReadAt(groupEnd, m_Bodies.data(), bodySize))
-        return damaged("an item group is cut short");
+      const std::uint8_t* pGroup = View(groupEnd, bodySize);
+      if (!pGroup) {
+        m_Bodies.resize(bodySize);
+        if (!ReadAt(groupEnd, m_Bodies.data(), bodySize))
+          return damaged("an item group is cut short");
+        pGroup = m_Bodies.data();
+      }
       std::uint64_t offset = 0;
       // Items at the state's time are moved in as a group, without a reference count each.
       const bool atStateTime = itemTime == time;
@@ -499,18 +514,17 @@ IResult VReader::ReadState(std::size_t index, ZMT::IFlowStateHandle& o_rState) {
           addGroup();
           return damaged("an item is missing or damaged");
         }
-        header.Decode(m_Bodies.data() + offset);
+        header.Decode(pGroup + offset);
         if (header.m_Type != std::uint16_t(EChunkType::ItemData) || header.m_PayloadSize < 4 ||
             header.m_PayloadSize > bodySize - offset - Format::ChunkHeaderSize) {
           addGroup();
           return damaged("an item is missing or damaged");
         }
         ZMT::IFlowItemToken token(0, typeId, flowStoreId);
-        std::memcpy(&token.m_ItemId, m_Bodies.data() + offset + Format::ChunkHeaderSize, 4);
+        std::memcpy(&token.m_ItemId, pGroup + offset + Format::ChunkHeaderSize, 4);
         const std::uint64_t body = offset + Format::ChunkHeaderSize + 4;
         ZMT::IFlowItemHandle item;
-        if (ReadBody(groupEnd + body, header.m_PayloadSize - 4, *pType, token, item,
-                     m_Bodies.data() + body)
+        if (ReadBody(groupEnd + body, header.m_PayloadSize - 4, *pType, token, item, pGroup + body)
                 .IsFailure())
           partial = true;
         else if (atStateTime)

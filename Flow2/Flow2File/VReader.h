@@ -12,6 +12,7 @@
 #include "Flow2/Flow2Types/IFlowBuffer.h"
 #include "Flow2/Flow2Types/IFlowState.h"
 #include "Flow2/Flow2Types/IFlowStore.h"
+#include "Utils/UtilsFileSystem/MemoryMappedInputStream.h"
 
 #include <cstdint>
 #include <map>
@@ -80,6 +81,9 @@ private:
   bool ReadHeader(std::uint64_t position, VChunkHeader& o_rHeader);
   bool ReadPayload(std::uint64_t position, const VChunkHeader& header);
   bool ReadAt(std::uint64_t position, void* o_pData, std::uint64_t size);
+  /// The bytes in place when the stream is a mapped file that holds them in one window; null
+  /// otherwise. Valid until the stream is used again.
+  const std::uint8_t* View(std::uint64_t position, std::uint64_t size);
   void Problem(const std::string& text) { m_Problems.push_back(text); }
   /// Follows a chain of TypeTable or ItemTable chunks from `first`.
   void ReadTableChain(std::uint64_t first, EChunkType type, std::vector<std::uint64_t>& o_rList);
@@ -100,6 +104,9 @@ private:
   ZMT::IFlowBufferFactoryHandle m_Buffers;
   ZMT::IFlowStateFactoryHandle m_States;
   ZMT::IInputStreamSeekable* m_pStream = nullptr;
+  /// The same stream when it is a memory-mapped file: groups are then read in place.
+  UtilsFileSystem::IInputStreamSeekableOwningAdapter<UtilsFileSystem::VMemoryMappedInputStream>*
+      m_pMapped = nullptr;
   std::uint64_t m_Start = 0;
   std::uint64_t m_Size = 0;
   std::uint64_t m_ChunksRead = 0;
