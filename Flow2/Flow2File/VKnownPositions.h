@@ -40,9 +40,13 @@ private:
     std::uint64_t m_Position = Empty;
     ZMT::IFlowItemToken m_Token;
   };
-  /// Fibonacci hashing: bodies a few dozen bytes apart spread over the whole table.
+  /// A full 64-bit mix (the finaliser of splitmix64): bodies a fixed number of bytes apart
+  /// spread over the whole table, which a single multiplication doesn't do for every stride.
   static std::size_t SlotOf(std::uint64_t position) {
-    return static_cast<std::size_t>((position * 0x9E3779B97F4A7C15ull) >> 48);
+    std::uint64_t x = position;
+    x = (x ^ (x >> 30)) * 0xBF58476D1CE4E5B9ull;
+    x = (x ^ (x >> 27)) * 0x94D049BB133111EBull;
+    return static_cast<std::size_t>((x ^ (x >> 31)) & (SlotCount - 1));
   }
 
   std::unique_ptr<VSlot[]> m_pSlots;

@@ -94,6 +94,31 @@ TEST_F(FlowItemLife, TheFreeListKeepsAWholeFrameAndDropsItsTwoOldestOnceTheLoadS
   EXPECT_EQ(created, 102u); // every later item reused a slot
 }
 
+// More items than buckets, so that every bucket chains several: live, cached and reused items
+// are each found, or not, by their own token.
+TEST_F(FlowItemLife, MoreItemsThanBucketsAreFoundByTokenThroughReuse) {
+  constexpr std::uint32_t Count = 20000;
+  std::vector<IFlowItemHandle> items;
+  ASSERT_TRUE(m_Store->CreateItems(TypeOf<VFlowTestPoint>(), Count, items).IsSuccess());
+  for (std::uint32_t i = 0; i < Count; i += 2)
+    items[i].Reset(); // ids 1, 3, 5, ... are cached
+  std::vector<IFlowItemHandle> reused;
+  ASSERT_TRUE(m_Store->CreateItems(TypeOf<VFlowTestPoint>(), 3000, reused).IsSuccess());
+  EXPECT_EQ(reused.back().GetToken().m_ItemId, Count + 3000);
+
+  IFlowItemHandle found;
+  for (std::uint32_t id = 1; id <= Count + 3000; ++id) {
+    const IResult result = m_Store->FindItem(IFlowItemToken(id, 101, 77), found);
+    // The 3000 oldest cached slots (ids 1, 3, ..., 5999) took the new ids.
+    const bool gone = id <= 6000 && id % 2 == 1;
+    ASSERT_EQ(result.IsSuccess(), !gone) << "id " << id;
+    if (!gone) ASSERT_EQ(found.GetToken().m_ItemId, id);
+    found.Reset();
+  }
+  // A token of another store with the same item id is another item.
+  EXPECT_EQ(m_Store->FindItem(IFlowItemToken(2, 101, 78), found), IResult(IResult::InvalidToken));
+}
+
 TEST_F(FlowItemLife, ARecycledItemIsRebuiltOnlyWhenItLastHeldMuch) {
   std::uint64_t live = 0, created = 0;
   for (int i = 0; i < 402; ++i) {
