@@ -5,7 +5,13 @@ namespace Flow2File {
 VItemPositionStore::VItemPositionStore() : m_Buckets(BucketCount, nullptr) {}
 
 VItemPositionStore::VItemPosition** VItemPositionStore::Bucket(const ZMT::IFlowItemToken& token) {
-  return &m_Buckets[ZMT::hash_value(token) % BucketCount];
+  // The item id plus a spread of type and store: a state's new items, numbered consecutively,
+  // land in consecutive buckets, one chain each.
+  const std::uint64_t spread =
+      (token.m_FlowStoreId ^ (std::uint64_t(token.m_TypeId) << 32 | token.m_TypeId)) *
+      0x9E3779B97F4A7C15ull;
+  return &m_Buckets[(token.m_ItemId + static_cast<std::uint32_t>(spread >> 40)) &
+                    (BucketCount - 1)];
 }
 
 VItemPositionStore::VItemPosition* VItemPositionStore::Allocate() {
@@ -57,7 +63,12 @@ void VItemPositionStore::RemoveFromBucket(VItemPosition* i_pEntry) {
 }
 
 VItemPositionStore::VListPair& VItemPositionStore::Lists(std::uint32_t typeId) {
-  return m_Lists[typeId];
+  // Items come in runs of one type: the last type's lists are kept at hand.
+  if (!m_pLastLists || m_LastListsType != typeId) {
+    m_pLastLists = &m_Lists[typeId]; // map nodes never move
+    m_LastListsType = typeId;
+  }
+  return *m_pLastLists;
 }
 
 bool VItemPositionStore::Find(const ZMT::IFlowItemToken& token, std::uint64_t& o_rPosition) {
@@ -119,6 +130,7 @@ void VItemPositionStore::EndState() {
 void VItemPositionStore::Clear() {
   std::fill(m_Buckets.begin(), m_Buckets.end(), nullptr);
   m_Lists.clear();
+  m_pLastLists = nullptr;
   m_pFree = nullptr;
   m_Blocks.clear();
   m_Generation = 0;

@@ -17,7 +17,7 @@ namespace Flow2File {
 
 class VItemPositionStore {
 public:
-  static constexpr std::size_t BucketCount = 2048;
+  static constexpr std::size_t BucketCount = 2048; // a power of two
   static constexpr std::size_t BlockSize = 128;
 
   VItemPositionStore();
@@ -65,6 +65,8 @@ private:
 
   std::vector<VItemPosition*> m_Buckets;
   std::map<std::uint32_t, VListPair> m_Lists;
+  VListPair* m_pLastLists = nullptr;
+  std::uint32_t m_LastListsType = 0;
   std::vector<std::unique_ptr<VItemPosition[]>> m_Blocks;
   VItemPosition* m_pFree = nullptr;
   std::uint64_t m_Generation = 0;

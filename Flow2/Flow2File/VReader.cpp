@@ -12,8 +12,6 @@ namespace {
 constexpr std::uint64_t FirstTable = 40;
 constexpr std::uint64_t SecondTable = 60;
 constexpr std::uint64_t AfterTables = 80;
-/// Chunk positions remembered for references before the memory is given back.
-constexpr std::size_t MaxKnown = 1 << 18;
 
 std::string At(std::uint64_t position) {
   return " at byte " + std::to_string(position);
@@ -26,6 +24,7 @@ VReader::VReader(ZMT::IFlowStoreHandle store, ZMT::IFlowBufferFactoryHandle buff
 
 void VReader::Close() {
   m_pStream = nullptr;
+  m_pMapped = nullptr;
   m_Start = m_Size = m_ChunksRead = m_LastIndexed = 0;
   m_Complete = false;
   m_Types.clear();
@@ -34,7 +33,7 @@ void VReader::Close() {
   m_Index.clear();
   m_Sessions.clear();
   m_ScanSession = VSessionInfo();
-  m_Known.clear();
+  m_Known.Clear();
   m_Problems.clear();
 }
 
@@ -42,6 +41,14 @@ bool VReader::ReadAt(std::uint64_t position, void* o_pData, std::uint64_t size) 
   if (position > m_Size || size > m_Size - position) return false;
   return m_pStream->Seek(static_cast<std::int64_t>(m_Start + position)) &&
          m_pStream->Read(o_pData, size);
+}
+
+const std::uint8_t* VReader::View(std::uint64_t position, std::uint64_t size) {
+  if (!m_pMapped || position > m_Size || size > m_Size - position ||
+      !m_pMapped->Seek(static_cast<std::int64_t>(m_Start + position)))
+    return nullptr;
+  const std::uint8_t* pData = nullptr;
+  return m_pMapped->Stream().GetContiguous(pData) >= size ? pData : nullptr;
 }
 
 bool VReader::ReadHeader(std::uint64_t position, VChunkHeader& o_rHeader) {
@@ -65,6 +72,8 @@ IResult VReader::Open(ZMT::IInputStreamSeekable* i_pStream) {
   Close();
   if (!i_pStream) return IResult::InvalidPointer;
   m_pStream = i_pStream;
+  m_pMapped = dynamic_cast<UtilsFileSystem::IInputStreamSeekableOwningAdapter<
+      UtilsFileSystem::VMemoryMappedInputStream>*>(i_pStream);
   std::uint64_t total = 0;
   if (!m_pStream->GetPosition(m_Start) || !m_pStream->GetSize(total) || total < m_Start) {
     Close();
@@ -363,8 +372,7 @@ IResult VReader::ReadBody(std::uint64_t position, std::uint64_t size, const VFil
     result = IResult::FailedWithException;
   }
   if (result.IsSuccess() && o_rItem) {
-    if (m_Known.size() >= MaxKnown) m_Known.clear();
-    m_Known[position] = o_rItem.GetToken();
+    m_Known.Record(position, o_rItem.GetToken());
   }
   return result;
 }
@@ -386,8 +394,8 @@ IResult VReader::ReadReferenced(std::uint64_t position, std::uint32_t typeId,
     return IResult::InvalidFormat;
   }
   const std::uint64_t body = position + Format::ChunkHeaderSize + fixed;
-  auto known = m_Known.find(body);
-  if (known != m_Known.end() && m_Store->FindItem(known->second, o_rItem).IsSuccess())
+  ZMT::IFlowItemToken known;
+  if (m_Known.Find(body, known) && m_Store->FindItem(known, o_rItem).IsSuccess())
     return IResult::Ok;
   if (header.m_PayloadSize < fixed) return IResult::InvalidFormat;
   if (fixed == 4) {
@@ -485,30 +493,48 @@ IResult VReader::ReadState(std::size_t index, ZMT::IFlowStateHandle& o_rState) {
       // The group's items are read in one piece and taken apart in memory.
       position = groupEnd;
       if (bodySize > m_Size - groupEnd) return damaged("the file ends inside an item group");
-      m_Bodies.resize(bodySize);
-      if (!ReadAt(groupEnd, m_Bodies.data(), bodySize))
-        return damaged("an item group is cut short");
+      const std::uint8_t* pGroup = View(groupEnd, bodySize);
+      if (!pGroup) {
+        m_Bodies.resize(bodySize);
+        if (!ReadAt(groupEnd, m_Bodies.data(), bodySize))
+          return damaged("an item group is cut short");
+        pGroup = m_Bodies.data();
+      }
       std::uint64_t offset = 0;
+      // Items at the state's time are moved in as a group, without a reference count each.
+      const bool atStateTime = itemTime == time;
+      m_GroupItems.clear();
+      auto addGroup = [&] {
+        if (!m_GroupItems.empty()) o_rState->AddItems(std::move(m_GroupItems));
+        m_GroupItems.clear();
+      };
       for (std::uint32_t i = 0; i < groupCount; ++i) {
         ++m_ChunksRead;
-        if (bodySize - offset < Format::ChunkHeaderSize + 4)
+        if (bodySize - offset < Format::ChunkHeaderSize + 4) {
+          addGroup();
           return damaged("an item is missing or damaged");
-        header.Decode(m_Bodies.data() + offset);
+        }
+        header.Decode(pGroup + offset);
         if (header.m_Type != std::uint16_t(EChunkType::ItemData) || header.m_PayloadSize < 4 ||
-            header.m_PayloadSize > bodySize - offset - Format::ChunkHeaderSize)
+            header.m_PayloadSize > bodySize - offset - Format::ChunkHeaderSize) {
+          addGroup();
           return damaged("an item is missing or damaged");
+        }
         ZMT::IFlowItemToken token(0, typeId, flowStoreId);
-        std::memcpy(&token.m_ItemId, m_Bodies.data() + offset + Format::ChunkHeaderSize, 4);
+        std::memcpy(&token.m_ItemId, pGroup + offset + Format::ChunkHeaderSize, 4);
         const std::uint64_t body = offset + Format::ChunkHeaderSize + 4;
         ZMT::IFlowItemHandle item;
-        if (ReadBody(groupEnd + body, header.m_PayloadSize - 4, *pType, token, item,
-                     m_Bodies.data() + body)
-                .IsFailure() ||
-            !o_rState->AddItem(item, itemTime))
+        if (ReadBody(groupEnd + body, header.m_PayloadSize - 4, *pType, token, item, pGroup + body)
+                .IsFailure())
+          partial = true;
+        else if (atStateTime)
+          m_GroupItems.push_back(std::move(item));
+        else if (!o_rState->AddItem(item, itemTime))
           partial = true;
         offset += Format::ChunkHeaderSize + header.m_PayloadSize;
         position = groupEnd + offset;
       }
+      addGroup();
       if (offset != bodySize) return damaged("item bodies don't match their group's size");
     }
     read += groupCount;

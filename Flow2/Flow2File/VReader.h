@@ -8,9 +8,11 @@
 // still reads, and each problem is described in GetProblems. One thread drives a reader.
 
 #include "Flow2/Flow2File/FlowFileFormat.h"
+#include "Flow2/Flow2File/VKnownPositions.h"
 #include "Flow2/Flow2Types/IFlowBuffer.h"
 #include "Flow2/Flow2Types/IFlowState.h"
 #include "Flow2/Flow2Types/IFlowStore.h"
+#include "Utils/UtilsFileSystem/MemoryMappedInputStream.h"
 
 #include <cstdint>
 #include <map>
@@ -79,6 +81,9 @@ private:
   bool ReadHeader(std::uint64_t position, VChunkHeader& o_rHeader);
   bool ReadPayload(std::uint64_t position, const VChunkHeader& header);
   bool ReadAt(std::uint64_t position, void* o_pData, std::uint64_t size);
+  /// The bytes in place when the stream is a mapped file that holds them in one window; null
+  /// otherwise. Valid until the stream is used again.
+  const std::uint8_t* View(std::uint64_t position, std::uint64_t size);
   void Problem(const std::string& text) { m_Problems.push_back(text); }
   /// Follows a chain of TypeTable or ItemTable chunks from `first`.
   void ReadTableChain(std::uint64_t first, EChunkType type, std::vector<std::uint64_t>& o_rList);
@@ -99,6 +104,9 @@ private:
   ZMT::IFlowBufferFactoryHandle m_Buffers;
   ZMT::IFlowStateFactoryHandle m_States;
   ZMT::IInputStreamSeekable* m_pStream = nullptr;
+  /// The same stream when it is a memory-mapped file: groups are then read in place.
+  UtilsFileSystem::IInputStreamSeekableOwningAdapter<UtilsFileSystem::VMemoryMappedInputStream>*
+      m_pMapped = nullptr;
   std::uint64_t m_Start = 0;
   std::uint64_t m_Size = 0;
   std::uint64_t m_ChunksRead = 0;
@@ -106,6 +114,8 @@ private:
   std::vector<std::uint8_t> m_Payload;
   /// The item chunks of one group.
   std::vector<std::uint8_t> m_Bodies;
+  /// The items of one group at the state's own time, moved into the state together.
+  ZMT::VItemHandles m_GroupItems;
   std::map<std::uint32_t, VFileType> m_Types;
   std::vector<std::uint64_t> m_TypePositions;
   std::vector<std::uint64_t> m_StaticPositions;
@@ -114,7 +124,7 @@ private:
   VSessionInfo m_ScanSession;
   std::uint64_t m_LastIndexed = 0;
   /// Tokens of item chunks read lately, so that a reference to one finds the item in the store.
-  std::unordered_map<std::uint64_t, ZMT::IFlowItemToken> m_Known;
+  VKnownPositions m_Known;
   std::vector<std::string> m_Problems;
 };
 

@@ -32,6 +32,9 @@ IResult VWriter::Open(ZMT::IOutputStreamSeekable* i_pStream) {
   std::uint64_t start = 0;
   if (!i_pStream->GetPosition(start)) return IResult::FileIOFailure;
   m_pSeekable = i_pStream;
+  // The index waits here until a chunk of it is written: its whole length up front, so that
+  // recording allocates nothing per state.
+  m_PendingIndex.reserve(Format::MaxPending + 1);
   IResult result = OpenCommon(start);
   if (result.IsSuccess())
     result = WriteTable(EChunkType::TypeTable, m_PendingTypes, m_LastTypeTable);

@@ -24,7 +24,12 @@ auto Key(const VFlowStateRecord& record) {
 }
 
 bool RecordLess(const VFlowStateRecord& a, const VFlowStateRecord& b) {
-  return Key(a) < Key(b);
+  // The order of Key, spelled out: this runs for every record added.
+  if (a.m_Token.m_TypeId != b.m_Token.m_TypeId) return a.m_Token.m_TypeId < b.m_Token.m_TypeId;
+  if (a.m_Time.m_Session != b.m_Time.m_Session) return a.m_Time.m_Session < b.m_Time.m_Session;
+  if (a.m_Time.m_Tick != b.m_Time.m_Tick) return a.m_Time.m_Tick < b.m_Time.m_Tick;
+  if (a.m_Token.m_ItemId != b.m_Token.m_ItemId) return a.m_Token.m_ItemId < b.m_Token.m_ItemId;
+  return a.m_Token.m_FlowStoreId < b.m_Token.m_FlowStoreId;
 }
 
 bool TokenLess(const IFlowItemToken& a, const IFlowItemToken& b) {
@@ -291,17 +296,22 @@ VRecordPosition VFlowState::Insert(const IFlowItemHandle& item, const VFlowTimes
 }
 
 VRecordPosition VFlowState::Insert(IFlowItemHandle&& io_rItem, const VFlowTimestamp& time) {
-  VFlowStateRecord probe{io_rItem.GetToken(), time, {}};
+  VFlowStateRecord probe{io_rItem.GetEntry()->m_Token, time, {}};
+  ++m_Revision;
   // Frames mostly arrive in order: appending needs no search.
-  auto it = m_Records.end();
-  if (!m_Records.empty() && !RecordLess(m_Records.back(), probe)) {
-    it = std::lower_bound(m_Records.begin(), m_Records.end(), probe, RecordLess);
-    if (it != m_Records.end() && Key(*it) == Key(probe)) return it - m_Records.begin();
+  if (m_Records.empty() || RecordLess(m_Records.back(), probe)) {
+    probe.m_Item = std::move(io_rItem);
+    Count(m_Records.emplace_back(std::move(probe)), 1);
+    return m_Records.size() - 1;
+  }
+  auto it = std::lower_bound(m_Records.begin(), m_Records.end(), probe, RecordLess);
+  if (it != m_Records.end() && Key(*it) == Key(probe)) {
+    --m_Revision;
+    return it - m_Records.begin();
   }
   probe.m_Item = std::move(io_rItem);
   it = m_Records.insert(it, std::move(probe));
   Count(*it, 1);
-  ++m_Revision;
   return it - m_Records.begin();
 }
 

@@ -26,6 +26,8 @@ IResult VFlowStore::Create(const ZMT::IFlowItemFactories& factories, std::uint64
       pStore->m_TypesById.emplace(info.m_TypeId, std::move(pTypeStore));
     }
     pStore->m_Factories = factories;
+    for (const auto& [typeId, pTypeStore] : pStore->m_TypesById) // in id order
+      pStore->m_TypeIndex.emplace_back(typeId, pTypeStore.get());
   } catch (const std::bad_alloc&) {
     return IResult::AllocationFailure;
   }
@@ -40,8 +42,10 @@ void VFlowStore::DropReference() {
 }
 
 VFlowStoreTypeSpecific* VFlowStore::ById(std::uint32_t typeId) const {
-  auto it = m_TypesById.find(typeId);
-  return it == m_TypesById.end() ? nullptr : it->second.get();
+  // A sorted array: every item made or read looks its type up here.
+  auto it = std::lower_bound(m_TypeIndex.begin(), m_TypeIndex.end(), typeId,
+                             [](const auto& entry, std::uint32_t id) { return entry.first < id; });
+  return it == m_TypeIndex.end() || it->first != typeId ? nullptr : it->second;
 }
 
 VItemStoreBase* VFlowStore::StoreOf(const ZMT::IFlowItemToken& token) const {

@@ -11,6 +11,8 @@
 #include <memory>
 #include <mutex>
 #include <string>
+#include <utility>
+#include <vector>
 
 namespace Flow2Store {
 
@@ -63,6 +65,8 @@ private:
   std::uint64_t m_FlowStoreId;
   std::map<std::uint32_t, std::unique_ptr<VFlowStoreTypeSpecific>> m_TypesById;
   std::map<std::string, VFlowStoreTypeSpecific*> m_TypesByName;
+  /// The type stores by id again, as a sorted array for the lookups of every item.
+  std::vector<std::pair<std::uint32_t, VFlowStoreTypeSpecific*>> m_TypeIndex;
   std::unique_ptr<VFlowStoreUnknownTypes> m_pUnknownTypes;
   ZMT::IFlowItemFactories m_Factories;
   std::atomic<std::uint32_t> m_RefCount{0};

@@ -62,6 +62,9 @@ VFlowStoreEntry* VFlowStoreTypeSpecific::TakeEntry() {
 void VFlowStoreTypeSpecific::Issue(VFlowStoreEntry* i_pEntry) {
   i_pEntry->m_Token = ZMT::IFlowItemToken(++m_NextItemId, m_TypeId, m_FlowStoreId);
   i_pEntry->m_RefCount.store(0, std::memory_order_relaxed);
+  // New ids walk the table one bucket at a time: fetch the next cache line of buckets early.
+  const std::uint32_t bucket = BucketOf(i_pEntry->m_Token);
+  if ((bucket & 7) == 0) __builtin_prefetch(&m_pBuckets[(bucket + 8) & (BucketCount - 1)], 1);
   Link(i_pEntry);
   MarkLive();
 }

@@ -1,5 +1,6 @@
 #include "Flow2/Flow2Store/VItemStoreBase.h"
 
+#include <algorithm>
 #include <utility>
 
 namespace Flow2Store {
@@ -22,69 +23,9 @@ VItemStoreBase::~VItemStoreBase() {
 }
 
 VFlowStoreEntry* VItemStoreBase::Lookup(const ZMT::IFlowItemToken& token) const {
-  for (VFlowStoreEntry* pEntry = m_pBuckets[ZMT::hash_value(token) % BucketCount]; pEntry;
-       pEntry = pEntry->m_pHashNext)
+  for (VFlowStoreEntry* pEntry = m_pBuckets[BucketOf(token)]; pEntry; pEntry = pEntry->m_pHashNext)
     if (pEntry->m_Token == token) return pEntry;
   return nullptr;
-}
-
-void VItemStoreBase::Link(VFlowStoreEntry* i_pEntry) {
-  VFlowStoreEntry*& rHead = m_pBuckets[ZMT::hash_value(i_pEntry->m_Token) % BucketCount];
-  i_pEntry->m_pHashNext = rHead;
-  rHead = i_pEntry;
-  i_pEntry->m_Linked = true;
-  ++m_LinkedCount;
-}
-
-void VItemStoreBase::Unlink(VFlowStoreEntry* i_pEntry) {
-  if (!i_pEntry->m_Linked) return;
-  VFlowStoreEntry** ppLink = &m_pBuckets[ZMT::hash_value(i_pEntry->m_Token) % BucketCount];
-  while (*ppLink && *ppLink != i_pEntry)
-    ppLink = &(*ppLink)->m_pHashNext;
-  if (*ppLink) *ppLink = i_pEntry->m_pHashNext;
-  i_pEntry->m_pHashNext = nullptr;
-  i_pEntry->m_Linked = false;
-  --m_LinkedCount;
-}
-
-void VItemStoreBase::FreePushBack(VFlowStoreEntry* i_pEntry) {
-  i_pEntry->m_pFreePrev = m_pFreeTail;
-  i_pEntry->m_pFreeNext = nullptr;
-  if (m_pFreeTail)
-    m_pFreeTail->m_pFreeNext = i_pEntry;
-  else
-    m_pFreeHead = i_pEntry;
-  m_pFreeTail = i_pEntry;
-  i_pEntry->m_Free = true;
-  ++m_FreeCount;
-}
-
-void VItemStoreBase::FreeUnlink(VFlowStoreEntry* i_pEntry) {
-  if (!i_pEntry->m_Free) return;
-  if (i_pEntry->m_pFreePrev)
-    i_pEntry->m_pFreePrev->m_pFreeNext = i_pEntry->m_pFreeNext;
-  else
-    m_pFreeHead = i_pEntry->m_pFreeNext;
-  if (i_pEntry->m_pFreeNext)
-    i_pEntry->m_pFreeNext->m_pFreePrev = i_pEntry->m_pFreePrev;
-  else
-    m_pFreeTail = i_pEntry->m_pFreePrev;
-  i_pEntry->m_pFreePrev = i_pEntry->m_pFreeNext = nullptr;
-  i_pEntry->m_Free = false;
-  --m_FreeCount;
-}
-
-VFlowStoreEntry* VItemStoreBase::FreePopFront() {
-  VFlowStoreEntry* pEntry = m_pFreeHead;
-  if (!pEntry) return nullptr;
-  FreeUnlink(pEntry);
-  Unlink(pEntry);
-  return pEntry;
-}
-
-void VItemStoreBase::MarkLive() {
-  if (++m_LiveCount > m_PeakLiveCount) m_PeakLiveCount = m_LiveCount;
-  if (m_LiveCount == 1) m_pOwner->AddReference();
 }
 
 void VItemStoreBase::Revive(VFlowStoreEntry* i_pEntry) {
@@ -122,10 +63,16 @@ void VItemStoreBase::ReleaseEntries(VFlowStoreEntry* const* i_ppEntries, std::si
         continue;
       }
       FreePushBack(pEntry);
-      if (m_FreeCount > FreeLimit && m_FreeCount > FreeLiveRatio * m_LiveCount)
+      if (m_FreeCount > FreeLimit &&
+          m_FreeCount > FreeLiveRatio * std::max(m_RoundPeak, m_PreviousRoundPeak))
         for (int j = 0; j < 2; ++j)
           delete FreePopFront();
       dropStore = --m_LiveCount == 0;
+      if (dropStore || ++m_RoundReleases == RoundReleases) {
+        m_PreviousRoundPeak = m_RoundPeak;
+        m_RoundPeak = m_LiveCount;
+        m_RoundReleases = 0;
+      }
     }
   }
   if (dropStore) m_pOwner->DropReference();

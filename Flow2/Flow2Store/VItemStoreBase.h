@@ -15,10 +15,14 @@ namespace Flow2Store {
 
 class VItemStoreBase {
 public:
-  static constexpr std::uint32_t BucketCount = 16384;
-  /// The free list is trimmed when longer than this and than FreeLiveRatio times the live count.
+  static constexpr std::uint32_t BucketCount = 16384; // a power of two
+  /// The free list is trimmed when longer than this and than FreeLiveRatio times the recent peak
+  /// of the live count: the larger peak of the current round and the previous one. A round ends
+  /// when the live count returns to zero or after RoundReleases releases, so a loop that releases
+  /// a whole frame keeps its entries, and a shrinking load gives them back within two rounds.
   static constexpr std::uint64_t FreeLimit = 100;
   static constexpr std::uint64_t FreeLiveRatio = 8;
+  static constexpr std::uint64_t RoundReleases = 65536;
 
   VItemStoreBase(std::shared_ptr<ZMT::IFlowItemFactory> i_pFactory, ZMT::IFlowStore* i_pOwner,
                  std::string name);
@@ -40,17 +44,76 @@ public:
   void GetCounts(std::uint64_t& o_rLive, std::uint64_t& o_rPeak, std::uint64_t& o_rCreated) const;
   std::uint64_t GetFreeCount() const;
 
+  /// The bucket of a token: its item id plus a spread of its type and store ids, so that the
+  /// consecutive ids a type store hands out fill consecutive buckets (eight to a cache line)
+  /// instead of one cold line each, while tokens of other stores and types start elsewhere.
+  static std::uint32_t BucketOf(const ZMT::IFlowItemToken& token) {
+    const std::uint64_t spread =
+        (token.m_FlowStoreId ^ (std::uint64_t(token.m_TypeId) << 32 | token.m_TypeId)) *
+        0x9E3779B97F4A7C15ull;
+    return (token.m_ItemId + static_cast<std::uint32_t>(spread >> 40)) & (BucketCount - 1);
+  }
+
 protected:
-  // All of these expect m_Mutex held.
+  // All of these expect m_Mutex held. The list and table work is inline: creating and releasing
+  // run it once per item.
   VFlowStoreEntry* Lookup(const ZMT::IFlowItemToken& token) const;
-  void Link(VFlowStoreEntry* i_pEntry);
-  void Unlink(VFlowStoreEntry* i_pEntry);
-  void FreePushBack(VFlowStoreEntry* i_pEntry);
-  void FreeUnlink(VFlowStoreEntry* i_pEntry);
+  void Link(VFlowStoreEntry* i_pEntry) {
+    VFlowStoreEntry*& rHead = m_pBuckets[BucketOf(i_pEntry->m_Token)];
+    i_pEntry->m_pHashNext = rHead;
+    rHead = i_pEntry;
+    i_pEntry->m_Linked = true;
+    ++m_LinkedCount;
+  }
+  void Unlink(VFlowStoreEntry* i_pEntry) {
+    if (!i_pEntry->m_Linked) return;
+    VFlowStoreEntry** ppLink = &m_pBuckets[BucketOf(i_pEntry->m_Token)];
+    while (*ppLink && *ppLink != i_pEntry)
+      ppLink = &(*ppLink)->m_pHashNext;
+    if (*ppLink) *ppLink = i_pEntry->m_pHashNext;
+    i_pEntry->m_pHashNext = nullptr;
+    i_pEntry->m_Linked = false;
+    --m_LinkedCount;
+  }
+  void FreePushBack(VFlowStoreEntry* i_pEntry) {
+    i_pEntry->m_pFreePrev = m_pFreeTail;
+    i_pEntry->m_pFreeNext = nullptr;
+    if (m_pFreeTail)
+      m_pFreeTail->m_pFreeNext = i_pEntry;
+    else
+      m_pFreeHead = i_pEntry;
+    m_pFreeTail = i_pEntry;
+    i_pEntry->m_Free = true;
+    ++m_FreeCount;
+  }
+  void FreeUnlink(VFlowStoreEntry* i_pEntry) {
+    if (!i_pEntry->m_Free) return;
+    if (i_pEntry->m_pFreePrev)
+      i_pEntry->m_pFreePrev->m_pFreeNext = i_pEntry->m_pFreeNext;
+    else
+      m_pFreeHead = i_pEntry->m_pFreeNext;
+    if (i_pEntry->m_pFreeNext)
+      i_pEntry->m_pFreeNext->m_pFreePrev = i_pEntry->m_pFreePrev;
+    else
+      m_pFreeTail = i_pEntry->m_pFreePrev;
+    i_pEntry->m_pFreePrev = i_pEntry->m_pFreeNext = nullptr;
+    i_pEntry->m_Free = false;
+    --m_FreeCount;
+  }
   /// The oldest free entry, out of the free list and the table; null if none.
-  VFlowStoreEntry* FreePopFront();
+  VFlowStoreEntry* FreePopFront() {
+    VFlowStoreEntry* pEntry = m_pFreeHead;
+    if (!pEntry) return nullptr;
+    FreeUnlink(pEntry);
+    Unlink(pEntry);
+    return pEntry;
+  }
   /// Counts a new live entry; the first one holds a reference to the store.
-  void MarkLive();
+  void MarkLive() {
+    if (++m_LiveCount > m_PeakLiveCount) m_PeakLiveCount = m_LiveCount;
+    if (m_LiveCount > m_RoundPeak) m_RoundPeak = m_LiveCount;
+    if (m_LiveCount == 1) m_pOwner->AddReference();
+  }
   /// A found entry gains an owner: a cached one comes back to life with one owner.
   void Revive(VFlowStoreEntry* i_pEntry);
 
@@ -66,6 +129,10 @@ protected:
   std::uint64_t m_LiveCount = 0;
   std::uint64_t m_PeakLiveCount = 0;
   std::uint64_t m_CreatedCount = 0;
+  /// Peaks of the live count in this round and the previous one, and this round's releases.
+  std::uint64_t m_RoundPeak = 0;
+  std::uint64_t m_PreviousRoundPeak = 0;
+  std::uint64_t m_RoundReleases = 0;
 };
 
 } // namespace Flow2Store

@@ -1,5 +1,7 @@
 #include "Utils/UtilsFileSystem/FileStreams.h"
 
+#include <cstdint>
+
 namespace UtilsFileSystem {
 
 VFileOutputStream::~VFileOutputStream() {
@@ -48,18 +50,57 @@ ZMT::IResult VFileInputStream::Close() {
   return CloseFile(std::exchange(m_pFile, nullptr));
 }
 
+bool IOutputStreamSeekableOwningAdapter<VFileOutputStream>::WriteLocked(const void* pBuffer,
+                                                                        std::uint64_t size) {
+  std::FILE* pFile = m_Stream.File();
+  const auto* pBytes = static_cast<const std::uint8_t*>(pBuffer);
+  if (m_Realign) {
+    const std::uint64_t boundary = (m_Position / FullBufferSize + 1) * FullBufferSize;
+    if (m_Position + size < boundary) {
+      m_Position += size;
+    } else {
+      const std::uint64_t head = boundary - m_Position;
+      if (head && ::fwrite_unlocked(pBytes, static_cast<std::size_t>(head), 1, pFile) != 1)
+        return false;
+      if (::fflush_unlocked(pFile) != 0) return false;
+      m_Realign = false;
+      pBytes += head;
+      size -= head;
+    }
+  }
+  return size == 0 || ::fwrite_unlocked(pBytes, static_cast<std::size_t>(size), 1, pFile) == 1;
+}
+
+bool IOutputStreamSeekableOwningAdapter<VFileOutputStream>::Write(const void* pBuffer,
+                                                                  std::uint64_t size) {
+  std::FILE* pFile = m_Stream.File();
+  if (!pFile) return false;
+  if (size == 0) return true;
+  ::flockfile(pFile);
+  const bool ok = WriteLocked(pBuffer, size);
+  ::funlockfile(pFile);
+  return ok;
+}
+
 bool IOutputStreamSeekableOwningAdapter<VFileOutputStream>::Write(const ZMT::VGatherList& pieces) {
   std::FILE* pFile = m_Stream.File();
   if (!pFile) return false;
   bool ok = true;
   ::flockfile(pFile);
   for (const auto& [pData, size] : pieces)
-    if (size && ::fwrite_unlocked(pData, static_cast<std::size_t>(size), 1, pFile) != 1) {
+    if (size && !WriteLocked(pData, size)) {
       ok = false;
       break;
     }
   ::funlockfile(pFile);
   return ok;
+}
+
+bool IOutputStreamSeekableOwningAdapter<VFileOutputStream>::Seek(std::int64_t position) {
+  if (!VFileSeekable::Seek(position)) return false;
+  m_Position = static_cast<std::uint64_t>(position);
+  m_Realign = m_Position % FullBufferSize != 0;
+  return true;
 }
 
 bool VFileSeekable::GetSize(std::uint64_t& o_rSize) {

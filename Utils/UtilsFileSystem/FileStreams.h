@@ -74,19 +74,27 @@ class IOutputStreamSeekableOwningAdapter<VFileOutputStream> : public ZMT::IOutpu
 public:
   explicit IOutputStreamSeekableOwningAdapter(VFileOutputStream stream)
       : m_Stream(std::move(stream)) {}
-  bool Write(const void* pBuffer, std::uint64_t size) override {
-    return m_Stream.Write(pBuffer, size);
-  }
+  bool Write(const void* pBuffer, std::uint64_t size) override;
   using ZMT::IOutputStream::Write;
   /// All pieces under one lock of the file.
   bool Write(const ZMT::VGatherList& pieces) override;
+  /// After a seek to a position that isn't a multiple of FullBufferSize, the buffer is flushed
+  /// once when the writing reaches the next multiple: the file's buffer then goes on writing whole
+  /// aligned blocks, which the kernel takes without zeroing the pages a block half covers.
+  bool Seek(std::int64_t position) override;
   VFileOutputStream& Stream() { return m_Stream; }
 
 protected:
   std::FILE* SeekableFile() const override { return m_Stream.File(); }
 
 private:
+  /// One piece, the file locked by the caller.
+  bool WriteLocked(const void* pBuffer, std::uint64_t size);
+
   VFileOutputStream m_Stream;
+  /// Where the next byte goes, kept only while a realigning flush is pending.
+  std::uint64_t m_Position = 0;
+  bool m_Realign = false;
 };
 
 template <class TStream> class IInputStreamSeekableOwningAdapter;

@@ -6,8 +6,11 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <fstream>
+#include <iterator>
+#include <vector>
 
 using namespace UtilsFileSystem;
 using ZMT::IResult;
@@ -64,6 +67,53 @@ TEST(FileIO, StreamsWriteSeekAndReadBack) {
   EXPECT_STREQ(text, "abXYZf");
   EXPECT_FALSE(input.Read(text, 1));
   EXPECT_TRUE(input.IsFailed());
+}
+
+// After a patch the stream flushes once at the next buffer-sized boundary: the bytes on both
+// sides of that split, by single and gathered writes, land where they were written.
+TEST(FileIO, WritesAfterAPatchSplitAtTheBufferBoundaryKeepEveryByte) {
+  VTempDir dir;
+  const auto path = dir / "patched.bin";
+  std::vector<std::uint8_t> expected;
+  auto bytes = [](std::size_t count, std::uint8_t seed) {
+    std::vector<std::uint8_t> out(count);
+    for (std::size_t i = 0; i < count; ++i)
+      out[i] = static_cast<std::uint8_t>(seed + i * 7);
+    return out;
+  };
+  {
+    auto [pFile, result] = OpenOutputFile(path, true);
+    ASSERT_EQ(result, IResult::Ok);
+    VFileOutputStreamVirtual stream{VFileOutputStream(pFile)};
+    expected = bytes(1000, 1);
+    ASSERT_TRUE(stream.Write(expected.data(), expected.size()));
+    // Patch 8 bytes in the middle and go back to the (unaligned) end.
+    ASSERT_TRUE(stream.Seek(100));
+    ASSERT_TRUE(stream.Write("PATCHED!", 8));
+    std::copy_n("PATCHED!", 8, expected.begin() + 100);
+    ASSERT_TRUE(stream.Seek(1000));
+    // Gathered pieces, one of them straddling the first boundary.
+    const auto first = bytes(FullBufferSize - 3000, 2);
+    const auto straddling = bytes(5000, 3);
+    ASSERT_TRUE(stream.Write(
+        ZMT::VGatherList{{first.data(), first.size()}, {straddling.data(), straddling.size()}}));
+    expected.insert(expected.end(), first.begin(), first.end());
+    expected.insert(expected.end(), straddling.begin(), straddling.end());
+    // A second patch, then a single write across the next boundary.
+    ASSERT_TRUE(stream.Seek(FullBufferSize + 10));
+    ASSERT_TRUE(stream.Write("#", 1));
+    expected[FullBufferSize + 10] = '#';
+    ASSERT_TRUE(stream.Seek(static_cast<std::int64_t>(expected.size())));
+    const auto last = bytes(FullBufferSize, 4);
+    ASSERT_TRUE(stream.Write(last.data(), last.size()));
+    expected.insert(expected.end(), last.begin(), last.end());
+    ASSERT_EQ(stream.Stream().Close(), IResult::Ok);
+  }
+  std::ifstream in(path.string(), std::ios::binary);
+  const std::vector<std::uint8_t> actual((std::istreambuf_iterator<char>(in)),
+                                         std::istreambuf_iterator<char>());
+  ASSERT_EQ(actual.size(), expected.size());
+  EXPECT_TRUE(actual == expected);
 }
 
 TEST(FileIO, FailedOpensGiveANullFileAndTheMappedCode) {
