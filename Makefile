@@ -56,7 +56,7 @@ tsan: setup
 	cmake -S . -B $(BUILD)-tsan -DCMAKE_BUILD_TYPE=RelWithDebInfo -DANVIL_BENCH=OFF \
 	  -DCMAKE_CXX_FLAGS="-fsanitize=thread -fno-omit-frame-pointer" \
 	  -DCMAKE_EXE_LINKER_FLAGS="-fsanitize=thread" $(CMAKE_FLAGS)
-	cmake --build $(BUILD)-tsan -j $(JOBS) --target test_Flow2Types test_Flow2Store
+	cmake --build $(BUILD)-tsan -j $(JOBS) --target test_Flow2Types test_Flow2Store test_Flow2File
 	cd $(BUILD)-tsan && TSAN_OPTIONS="halt_on_error=1 second_deadlock_stack=1" \
 	  ctest -R 'Flow' --output-on-failure
 
