@@ -63,16 +63,10 @@ void VItemStoreBase::ReleaseEntries(VFlowStoreEntry* const* i_ppEntries, std::si
         continue;
       }
       FreePushBack(pEntry);
-      if (m_FreeCount > FreeLimit &&
-          m_FreeCount > FreeLiveRatio * std::max(m_RoundPeak, m_PreviousRoundPeak))
+      if (m_FreeCount > FreeLimit && m_FreeCount > FreeLiveRatio * m_LiveCount)
         for (int j = 0; j < 2; ++j)
           delete FreePopFront();
       dropStore = --m_LiveCount == 0;
-      if (dropStore || ++m_RoundReleases == RoundReleases) {
-        m_PreviousRoundPeak = m_RoundPeak;
-        m_RoundPeak = m_LiveCount;
-        m_RoundReleases = 0;
-      }
     }
   }
   if (dropStore) m_pOwner->DropReference();

@@ -16,13 +16,9 @@ namespace Flow2Store {
 class VItemStoreBase {
 public:
   static constexpr std::uint32_t BucketCount = 16384; // a power of two
-  /// The free list is trimmed when longer than this and than FreeLiveRatio times the recent peak
-  /// of the live count: the larger peak of the current round and the previous one. A round ends
-  /// when the live count returns to zero or after RoundReleases releases, so a loop that releases
-  /// a whole frame keeps its entries, and a shrinking load gives them back within two rounds.
+  /// The free list is trimmed when longer than this and than FreeLiveRatio times the live count.
   static constexpr std::uint64_t FreeLimit = 100;
   static constexpr std::uint64_t FreeLiveRatio = 8;
-  static constexpr std::uint64_t RoundReleases = 65536;
 
   VItemStoreBase(std::shared_ptr<ZMT::IFlowItemFactory> i_pFactory, ZMT::IFlowStore* i_pOwner,
                  std::string name);
@@ -111,7 +107,6 @@ protected:
   /// Counts a new live entry; the first one holds a reference to the store.
   void MarkLive() {
     if (++m_LiveCount > m_PeakLiveCount) m_PeakLiveCount = m_LiveCount;
-    if (m_LiveCount > m_RoundPeak) m_RoundPeak = m_LiveCount;
     if (m_LiveCount == 1) m_pOwner->AddReference();
   }
   /// A found entry gains an owner: a cached one comes back to life with one owner.
@@ -129,10 +124,6 @@ protected:
   std::uint64_t m_LiveCount = 0;
   std::uint64_t m_PeakLiveCount = 0;
   std::uint64_t m_CreatedCount = 0;
-  /// Peaks of the live count in this round and the previous one, and this round's releases.
-  std::uint64_t m_RoundPeak = 0;
-  std::uint64_t m_PreviousRoundPeak = 0;
-  std::uint64_t m_RoundReleases = 0;
 };
 
 } // namespace Flow2Store
