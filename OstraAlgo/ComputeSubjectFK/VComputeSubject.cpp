@@ -8,15 +8,37 @@ namespace ComputeSubject {
 
 using namespace KinematicAlgo;
 
+VComputeSegment VComputeSubject::VSegmentFactory::Create(const ISegmentCalibrated& segment,
+                                                         bool freeSegments) const {
+  return VComputeSegment(segment, m_UseRotator, freeSegments);
+}
+
+std::unique_ptr<IComputeTarget>
+VComputeSubject::VTargetFactory::Create(const ITargetCalibrated& target,
+                                        const SegmentLookup& lookup) const {
+  return MakeComputeTarget(target, lookup);
+}
+
 VComputeSubject::VComputeSubject(std::shared_ptr<const ISubjectCalibrated> subject, std::uint8_t,
                                  std::uint32_t mode, std::uint32_t useRotator)
-    : m_pSubject(std::move(subject)), m_Mode(mode), m_UseRotator(useRotator) {
+    : VComputeSubject(std::move(subject), mode, std::make_shared<VSegmentFactory>(useRotator != 0),
+                      nullptr) {}
+
+VComputeSubject::VComputeSubject(std::shared_ptr<const ISubjectCalibrated> subject,
+                                 std::uint32_t mode,
+                                 std::shared_ptr<const ISegmentFactory> segmentFactory,
+                                 std::shared_ptr<const ITargetFactory> targetFactory)
+    : m_pSubject(std::move(subject)), m_Mode(mode), m_pSegmentFactory(std::move(segmentFactory)),
+      m_pTargetFactory(std::move(targetFactory)) {
   if (!m_pSubject) throw VConstructionException("VComputeSubject needs a subject");
+  if (!m_pSegmentFactory) m_pSegmentFactory = std::make_shared<VSegmentFactory>();
+  if (!m_pTargetFactory) m_pTargetFactory = std::make_shared<VTargetFactory>();
   Build();
 }
 
 VComputeSubject::VComputeSubject(const VComputeSubject& other)
-    : m_pSubject(other.m_pSubject), m_Mode(other.m_Mode), m_UseRotator(other.m_UseRotator) {
+    : m_pSubject(other.m_pSubject), m_Mode(other.m_Mode),
+      m_pSegmentFactory(other.m_pSegmentFactory), m_pTargetFactory(other.m_pTargetFactory) {
   Build();
 }
 
@@ -25,14 +47,14 @@ void VComputeSubject::Build() {
   m_Segments.reserve(size_t(tree.Size())); // targets keep pointers into this vector
   for (std::int32_t i = 0; i < tree.Size(); ++i) {
     if (!tree[i].m_Value) throw VConstructionException("VComputeSubject: a segment is missing");
-    m_Segments.emplace_back(*tree[i].m_Value, m_UseRotator != 0, m_Mode == EFreeSegmentsMode);
+    m_Segments.push_back(m_pSegmentFactory->Create(*tree[i].m_Value, m_Mode == EFreeSegmentsMode));
     m_Segments.back().SetUp(i, tree[i].m_Parent, m_NumJointParams, std::uint32_t(tree.Depth(i)));
     m_NumJointParams += m_Segments.back().NumParams();
   }
   for (std::uint32_t t = 0; t < m_pSubject->NumTargets(); ++t) {
     const auto target = m_pSubject->Target(t);
     m_ModelTargets.push_back(target);
-    std::unique_ptr<IComputeTarget> computed = MakeComputeTarget(*target, Lookup());
+    std::unique_ptr<IComputeTarget> computed = m_pTargetFactory->Create(*target, Lookup());
     if (!computed) continue;
     m_NumTargetParams += computed->NumParams();
     m_Targets.push_back(std::move(computed));
@@ -310,7 +332,10 @@ void VComputeSubject::BuildChain(std::uint32_t index, VTgtChainInfo& o_rInfo) co
     else
       o_rInfo.m_Runs.emplace_back(first, end);
   }
-  o_rInfo.m_pTarget = MakeComputeTarget(m_Targets[index]->Target(), &o_rInfo.m_Chain.back());
+  // Through the factory, so the chain's copy is of the subject's own kind for that target.
+  const VComputeSegment* parent = &o_rInfo.m_Chain.back();
+  o_rInfo.m_pTarget = m_pTargetFactory->Create(m_Targets[index]->Target(),
+                                               [parent](std::uint32_t) { return parent; });
 }
 
 VComputeSubject::VTgtChainInfo* VComputeSubject::Chain(std::uint32_t index) {

@@ -22,6 +22,22 @@ namespace ComputeSubject {
 
 class IComputeSubject {
 public:
+  /// Builds the run-time segment of one model segment; `freeSegments` for the free-segment mode.
+  class ISegmentFactory {
+  public:
+    virtual ~ISegmentFactory() = default;
+    virtual VComputeSegment Create(const KinematicAlgo::ISegmentCalibrated& segment,
+                                   bool freeSegments) const = 0;
+  };
+  /// Builds the run-time target of one model target, its segments found through `lookup`; null
+  /// drops the target from the subject.
+  class ITargetFactory {
+  public:
+    virtual ~ITargetFactory() = default;
+    virtual std::unique_ptr<IComputeTarget> Create(const KinematicAlgo::ITargetCalibrated& target,
+                                                   const SegmentLookup& lookup) const = 0;
+  };
+
   virtual ~IComputeSubject() = default;
   virtual const KinematicAlgo::ISubjectCalibrated& Subject() const = 0;
   virtual std::uint32_t NumSegments() const = 0;
@@ -45,6 +61,24 @@ inline constexpr VWithTargets WithTargets{};
 
 class VComputeSubject : public IComputeSubject {
 public:
+  /// The default segment factory: VComputeSegment with or without the rotator.
+  class VSegmentFactory : public ISegmentFactory {
+  public:
+    explicit VSegmentFactory(bool useRotator = false) : m_UseRotator(useRotator) {}
+    VComputeSegment Create(const KinematicAlgo::ISegmentCalibrated& segment,
+                           bool freeSegments) const override;
+    bool UseRotator() const { return m_UseRotator; }
+
+  private:
+    bool m_UseRotator;
+  };
+  /// The default target factory: every model target class with a run-time form.
+  class VTargetFactory : public ITargetFactory {
+  public:
+    std::unique_ptr<IComputeTarget> Create(const KinematicAlgo::ITargetCalibrated& target,
+                                           const SegmentLookup& lookup) const override;
+  };
+
   /// `ignored` is kept for callers that pass it and changes nothing. `mode` EFreeSegmentsMode
   /// places every segment by six free parameters (the state is then six per segment in tree
   /// order, see VComputeSegment); any other value uses the joints. `useRotator` as for
@@ -53,6 +87,11 @@ public:
   explicit VComputeSubject(std::shared_ptr<const KinematicAlgo::ISubjectCalibrated> subject,
                            std::uint8_t ignored = 0, std::uint32_t mode = 1,
                            std::uint32_t useRotator = 0);
+  /// As above with the given factories; a null one is replaced by the default (a null segment
+  /// factory by VSegmentFactory without the rotator). Copies share the factories.
+  VComputeSubject(std::shared_ptr<const KinematicAlgo::ISubjectCalibrated> subject,
+                  std::uint32_t mode, std::shared_ptr<const ISegmentFactory> segmentFactory,
+                  std::shared_ptr<const ITargetFactory> targetFactory);
   /// Independent copy: segments and targets are rebuilt, targets follow the copy's segments.
   VComputeSubject(const VComputeSubject& other);
   VComputeSubject& operator=(const VComputeSubject&) = delete;
@@ -68,6 +107,8 @@ public:
   std::uint32_t NumJointParams() const override { return m_NumJointParams; }
   std::uint32_t NumTargetParams() const override { return m_NumTargetParams; }
   std::uint32_t Mode() const { return m_Mode; }
+  const ISegmentFactory& SegmentFactory() const { return *m_pSegmentFactory; }
+  const ITargetFactory& TargetFactory() const { return *m_pTargetFactory; }
   /// How many times forward kinematics has run over the tree (for callers that check caching).
   std::uint64_t NumPoseEvaluations() const { return m_PoseEvaluations; }
 
@@ -164,7 +205,8 @@ private:
 
   std::shared_ptr<const KinematicAlgo::ISubjectCalibrated> m_pSubject;
   std::uint32_t m_Mode;
-  std::uint32_t m_UseRotator;
+  std::shared_ptr<const ISegmentFactory> m_pSegmentFactory;
+  std::shared_ptr<const ITargetFactory> m_pTargetFactory;
   std::vector<VComputeSegment> m_Segments;
   std::vector<std::unique_ptr<IComputeTarget>> m_Targets;
   /// Each run-time target's position in the model's target list (targets without a run-time
