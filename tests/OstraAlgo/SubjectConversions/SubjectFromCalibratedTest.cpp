@@ -1,4 +1,5 @@
 #include "../../River/CoreOstraTypesUtils/ValidSubject.h"
+#include "SubjectCompare.h"
 
 #include "DebugServices/LogCapture.h"
 #include "OstraAlgo/KinematicAlgo/SubjectCalibratedFromRecord.h"
@@ -17,12 +18,6 @@ using CoreOstraTypes::VSubjectApplicationData;
 using testing::ElementsAre;
 
 namespace {
-
-template <class A, class B> void ExpectNear(const A& a, const B& b, double tolerance = 1e-12) {
-  ASSERT_EQ(a.size(), b.size());
-  for (std::size_t i = 0; i < a.size(); ++i)
-    EXPECT_NEAR(a[i], b[i], tolerance) << "entry " << i;
-}
 
 std::shared_ptr<VTargetPosition> Point(const std::string& name, std::int32_t id,
                                        std::uint32_t parent, const Eigen::Vector3d& position) {
@@ -66,12 +61,8 @@ TEST(SubjectFromCalibrated, TheRecordOfEveryKindComesBackFromItsModel) {
     const auto &b = back.m_Segments[i], &o = original.m_Segments[i];
     EXPECT_EQ(b.m_Name, o.m_Name);
     EXPECT_EQ(b.m_SegmentIndex, o.m_SegmentIndex);
-    EXPECT_EQ(b.m_ParentSegmentIndex, o.m_ParentSegmentIndex);
     EXPECT_EQ(b.m_TreeDepth, o.m_TreeDepth);
-    ExpectNear(b.m_PreRotation, o.m_PreRotation);
-    ExpectNear(b.m_PreTranslation, o.m_PreTranslation);
-    ExpectNear(b.m_InversePostRotation, o.m_InversePostRotation);
-    ExpectNear(b.m_InversePostTranslation, o.m_InversePostTranslation);
+    ExpectSegmentPoseNear(b, o);
     EXPECT_EQ(b.m_Bounds, o.m_Bounds);
     EXPECT_EQ(b.m_Joint.m_Name, o.m_Name); // the model names joints after their segments
     EXPECT_EQ(b.m_Joint.m_JointType, o.m_Joint.m_JointType);
