@@ -1,7 +1,7 @@
 #include "River/CoreOstraTypesUtils/MathParser.h"
 
-#include "River/CoreOstraTypesUtils/ExpressionNumber.h"
 #include "River/CoreOstraTypesUtils/VMathFactorySimple.h"
+#include "Utils/UtilsText/ShortDecimal.h"
 
 #include <cctype>
 #include <cmath>
@@ -414,7 +414,7 @@ bool ParseWith(TBuilder& builder, const std::string& text, typename TBuilder::Va
 bool ReadPlainNumber(const std::string& text, double& o_rValue) {
   const std::size_t start = !text.empty() && text[0] == '-' ? 1 : 0;
   double value = 0.0;
-  if (!ReadShortDecimal(std::string_view(text).substr(start), value)) {
+  if (!UtilsText::ParseUnsignedShortDecimal(std::string_view(text).substr(start), value)) {
     bool digit = false, point = false;
     for (std::size_t i = start; i < text.size(); ++i) {
       if (IsDigit(text[i])) {

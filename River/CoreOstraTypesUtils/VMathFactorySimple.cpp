@@ -1,6 +1,6 @@
 #include "River/CoreOstraTypesUtils/VMathFactorySimple.h"
 
-#include "River/CoreOstraTypesUtils/ExpressionNumber.h"
+#include "Utils/UtilsText/ShortDecimal.h"
 
 #include <cerrno>
 #include <cmath>
@@ -41,7 +41,7 @@ double FirstOf(std::span<const double> values) {
 } // namespace
 
 bool ReadNumberText(const std::string& text, double& o_rValue) {
-  if (ReadShortDecimal(text, o_rValue)) return true;
+  if (UtilsText::ParseUnsignedShortDecimal(text, o_rValue)) return true;
   const auto hash = text.find('#');
   if (hash != std::string::npos) {
     // "1.#INF" and "1.#IND": the legacy spellings of infinity and NaN.

@@ -1,4 +1,5 @@
 #include "Utils/UtilsRapidXml/AttributeText.h"
+#include "Utils/UtilsText/ShortDecimal.h"
 
 #include <cctype>
 #include <charconv>
@@ -55,35 +56,6 @@ struct VSpecialDouble {
 
 } // namespace
 
-// The digits form an integer held exactly, and one division by an exact power of ten rounds
-// correctly: the result is the one strtod gives.
-bool ParseShortDecimal(std::string_view text, double& o_rValue) {
-  static constexpr double powersOfTen[] = {1e0, 1e1, 1e2,  1e3,  1e4,  1e5,  1e6,  1e7,
-                                           1e8, 1e9, 1e10, 1e11, 1e12, 1e13, 1e14, 1e15};
-  const char* p = text.data();
-  const char* const end = p + text.size();
-  const bool negative = p < end && *p == '-';
-  if (negative) ++p;
-  std::uint64_t mantissa = 0;
-  int digits = 0, fractionDigits = 0;
-  bool point = false;
-  for (; p < end; ++p) {
-    if (*p >= '0' && *p <= '9') {
-      if (++digits > 15) return false;
-      mantissa = mantissa * 10 + static_cast<std::uint64_t>(*p - '0');
-      if (point) ++fractionDigits;
-    } else if (*p == '.' && !point) {
-      point = true;
-    } else {
-      return false;
-    }
-  }
-  if (digits == 0) return false;
-  const double value = static_cast<double>(mantissa) / powersOfTen[fractionDigits];
-  o_rValue = negative ? -value : value;
-  return true;
-}
-
 std::string_view TrimBlanks(std::string_view text) {
   while (!text.empty() && IsBlank(text.front()))
     text.remove_prefix(1);
@@ -112,7 +84,7 @@ bool ParseDouble(std::string_view text, double& o_rValue) {
   // from_chars and the scanf conversion below agree to the bit (both round correctly). Anything
   // else (a sign other than minus, hexadecimal, inf, nan, a value out of range) takes the scanf
   // road so that it reads exactly as it always has.
-  if (ParseShortDecimal(trimmed, o_rValue)) return true;
+  if (UtilsText::ParseShortDecimal(trimmed, o_rValue)) return true;
   if (StartsPlainNumber(trimmed)) {
     double value = 0.0;
     const char* last = trimmed.data() + trimmed.size();

@@ -21,11 +21,6 @@ std::vector<std::string_view> SplitBlanks(std::string_view text);
 /// (negative quiet NaN).
 bool ParseDouble(std::string_view text, double& o_rValue);
 
-/// As ParseDouble for the short plain decimals that fill most files ("0", "-20", "0.01": at
-/// most 15 digits, no exponent), exactly, without the general conversion. False, with
-/// `o_rValue` untouched, for any other text.
-bool ParseShortDecimal(std::string_view text, double& o_rValue);
-
 /// "%.17g": round-trips every double; non-finite values print as inf, -inf, nan, -nan. Zero
 /// prints as "0" whatever its sign.
 std::string FormatDouble(double value);

@@ -2,6 +2,7 @@
 
 #include "DebugServices/GlobalLog.h"
 #include "Utils/UtilsRapidXml/AttributeText.h"
+#include "Utils/UtilsText/ShortDecimal.h"
 
 #include <boost/container/small_vector.hpp>
 
@@ -47,12 +48,10 @@ bool ReadConverted(INode& node, std::string_view name, T& o_rValue, std::string_
 using VNumbers = boost::container::small_vector<double, 36>;
 
 /// Splits `text` at blanks and converts each token, into `o_rValues`. Short plain decimals are
-/// converted as they are scanned, with ParseShortDecimal's arithmetic (so to the same value);
+/// converted as they are scanned, with UtilsText::ShortDecimalValue (so to the same value);
 /// other tokens go to `parse`. Returns false when a token did not convert (the count of
 /// `o_rValues` is still that of the tokens).
 template <class F> bool ScanNumbers(std::string_view text, VNumbers& o_rValues, F parse) {
-  static constexpr double powersOfTen[] = {1e0, 1e1, 1e2,  1e3,  1e4,  1e5,  1e6,  1e7,
-                                           1e8, 1e9, 1e10, 1e11, 1e12, 1e13, 1e14, 1e15};
   bool parsed = true;
   const char* p = text.data();
   const char* const end = p + text.size();
@@ -81,8 +80,8 @@ template <class F> bool ScanNumbers(std::string_view text, VNumbers& o_rValues, 
         ++p;
     }
     double value = 0.0;
-    if (plain && digits > 0 && digits <= 15) {
-      value = static_cast<double>(mantissa) / powersOfTen[fractionDigits];
+    if (plain && digits > 0 && digits <= UtilsText::ShortDecimalDigits) {
+      value = UtilsText::ShortDecimalValue(mantissa, fractionDigits);
       if (negative) value = -value;
     } else if (parsed &&
                !parse(std::string_view(start, static_cast<std::size_t>(p - start)), value)) {

@@ -138,18 +138,3 @@ TEST(NumberText, ParsingMatchesScanfBitForBit) {
     }
   }
 }
-
-TEST(NumberText, ShortDecimalsTakeOnlyWhatTheyCanReadExactly) {
-  double value = 7.0;
-  EXPECT_TRUE(ParseShortDecimal("-20", value));
-  EXPECT_EQ(value, -20.0);
-  EXPECT_TRUE(ParseShortDecimal("0.01", value));
-  EXPECT_EQ(value, 0.01);
-  EXPECT_TRUE(ParseShortDecimal("-0", value));
-  EXPECT_TRUE(std::signbit(value));
-  value = 7.0;
-  for (const char* other : {"", "-", ".", "1e5", "+1", " 1", "1234567890123456", "1.2.3", "inf"}) {
-    EXPECT_FALSE(ParseShortDecimal(other, value)) << other;
-    EXPECT_EQ(value, 7.0) << other;
-  }
-}
