@@ -32,15 +32,6 @@ void VComputeSubject::VSegmentComputerImpl::SetTree(std::span<VComputeSegment> t
   }
 }
 
-void VComputeSubject::VSegmentComputerImpl::Update(std::uint32_t cursor, ConstView params,
-                                                   std::uint32_t type) {
-  VComputeSegment& segment = m_Tree[cursor];
-  const std::int32_t p = m_Parents[cursor];
-  const VComputeSegment* parent = p < 0 ? nullptr : &m_Tree[size_t(p)];
-  if (type < EChainOnly) segment.UpdatePose(params.data(), parent);
-  if (type != ENone) segment.UpdateJacobian(params.data(), parent, type);
-}
-
 void VComputeSubject::VSegmentComputerImpl::SetUp(std::uint32_t cursor, std::uint32_t firstParam,
                                                   std::uint32_t) {
   // One block per segment on the path to the root covers every Jacobian type (the joint and
