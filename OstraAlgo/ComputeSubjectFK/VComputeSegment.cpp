@@ -78,14 +78,16 @@ VComputeSegment::VComputeSegment(const VComputeSegment& other)
       m_NumBlocks(other.m_NumBlocks), m_FreeSegment(other.m_FreeSegment), m_ModelP(other.m_ModelP),
       m_FreeParams(other.m_FreeParams), m_FreeJacobian(other.m_FreeJacobian) {}
 
-void VComputeSegment::SetUp(std::int32_t index, std::int32_t parent, std::uint32_t firstParam,
-                            std::uint32_t depth) {
+void VComputeSegment::Place(std::int32_t index, std::int32_t parent) {
   m_Index = index;
   m_Parent = parent;
+  m_FreeJacobian.m_FirstParam = 6 * std::uint32_t(index);
+}
+
+void VComputeSegment::SetUp(std::uint32_t firstParam, std::uint32_t numBlocks) {
   m_FirstParam = firstParam;
   m_Own.m_FirstParam = firstParam;
-  m_Blocks.assign(depth + 1, JointJacobian());
-  m_FreeJacobian.m_FirstParam = 6 * std::uint32_t(index);
+  m_Blocks.assign(numBlocks, JointJacobian());
 }
 
 void VComputeSegment::UpdatePose(const double* params, const VComputeSegment* parent) {

@@ -84,10 +84,10 @@ public:
 
 private:
   friend class VComputeSubject;
-  /// Places the segment in the tree and allocates its Jacobian blocks (one per node on the path
-  /// to the root) once.
-  void SetUp(std::int32_t index, std::int32_t parent, std::uint32_t firstParam,
-             std::uint32_t depth);
+  /// Places the segment in the tree.
+  void Place(std::int32_t index, std::int32_t parent);
+  /// Sets the first parameter and allocates `numBlocks` Jacobian blocks once.
+  void SetUp(std::uint32_t firstParam, std::uint32_t numBlocks);
   /// Forward kinematics from the joint parameters; parent null at the root.
   void UpdatePose(const double* params, const VComputeSegment* parent);
   /// Jacobian blocks of `type` (EChain, EJoint or EFree, with or without "only").

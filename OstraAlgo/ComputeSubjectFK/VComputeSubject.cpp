@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cmath>
 #include <map>
+#include <typeinfo>
 
 namespace ComputeSubject {
 
@@ -27,18 +28,25 @@ VComputeSubject::VComputeSubject(std::shared_ptr<const ISubjectCalibrated> subje
 VComputeSubject::VComputeSubject(std::shared_ptr<const ISubjectCalibrated> subject,
                                  std::uint32_t mode,
                                  std::shared_ptr<const ISegmentFactory> segmentFactory,
-                                 std::shared_ptr<const ITargetFactory> targetFactory)
+                                 std::shared_ptr<const ITargetFactory> targetFactory,
+                                 std::shared_ptr<ISegmentComputer> segmentComputer,
+                                 std::shared_ptr<const ITargetComputer> targetComputer)
     : m_pSubject(std::move(subject)), m_Mode(mode), m_pSegmentFactory(std::move(segmentFactory)),
-      m_pTargetFactory(std::move(targetFactory)) {
+      m_pTargetFactory(std::move(targetFactory)), m_pSegmentComputer(std::move(segmentComputer)),
+      m_pTargetComputer(std::move(targetComputer)) {
   if (!m_pSubject) throw VConstructionException("VComputeSubject needs a subject");
   if (!m_pSegmentFactory) m_pSegmentFactory = std::make_shared<VSegmentFactory>();
   if (!m_pTargetFactory) m_pTargetFactory = std::make_shared<VTargetFactory>();
+  if (!m_pSegmentComputer) m_pSegmentComputer = std::make_shared<VSegmentComputerImpl>();
+  if (!m_pTargetComputer) m_pTargetComputer = std::make_shared<VTargetComputer>();
   Build();
 }
 
 VComputeSubject::VComputeSubject(const VComputeSubject& other)
     : m_pSubject(other.m_pSubject), m_Mode(other.m_Mode),
-      m_pSegmentFactory(other.m_pSegmentFactory), m_pTargetFactory(other.m_pTargetFactory) {
+      m_pSegmentFactory(other.m_pSegmentFactory), m_pTargetFactory(other.m_pTargetFactory),
+      m_pSegmentComputer(other.m_pSegmentComputer->Clone()),
+      m_pTargetComputer(other.m_pTargetComputer) {
   Build();
 }
 
@@ -48,8 +56,13 @@ void VComputeSubject::Build() {
   for (std::int32_t i = 0; i < tree.Size(); ++i) {
     if (!tree[i].m_Value) throw VConstructionException("VComputeSubject: a segment is missing");
     m_Segments.push_back(m_pSegmentFactory->Create(*tree[i].m_Value, m_Mode == EFreeSegmentsMode));
-    m_Segments.back().SetUp(i, tree[i].m_Parent, m_NumJointParams, std::uint32_t(tree.Depth(i)));
-    m_NumJointParams += m_Segments.back().NumParams();
+    m_Segments.back().Place(i, tree[i].m_Parent);
+  }
+  // The computer allocates every segment's Jacobian blocks once, here, before any target binds.
+  m_pSegmentComputer->SetTree(m_Segments);
+  for (std::uint32_t i = 0; i < m_Segments.size(); ++i) {
+    m_pSegmentComputer->SetUp(i, m_NumJointParams, EChain);
+    m_NumJointParams += m_pSegmentComputer->NumParams(m_Segments[i]);
   }
   for (std::uint32_t t = 0; t < m_pSubject->NumTargets(); ++t) {
     const auto target = m_pSubject->Target(t);
@@ -57,6 +70,7 @@ void VComputeSubject::Build() {
     std::unique_ptr<IComputeTarget> computed = m_pTargetFactory->Create(*target, Lookup());
     if (!computed) continue;
     m_NumTargetParams += computed->NumParams();
+    (computed->NumParams() ? m_ParamTargets : m_PlainTargets).push_back(computed.get());
     m_Targets.push_back(std::move(computed));
     m_TargetModelIndex.push_back(t);
   }
@@ -79,33 +93,56 @@ const VComputeTargetPosition* VComputeSubject::PositionTarget(std::uint32_t i) c
   return dynamic_cast<const VComputeTargetPosition*>(m_Targets[i].get());
 }
 
+// Defined here, next to the loop that calls it, so that loop can call it directly.
+void VComputeSubject::VSegmentComputerImpl::Update(std::uint32_t cursor, ConstView params,
+                                                   std::uint32_t type) {
+  VComputeSegment& segment = m_Tree[cursor];
+  const std::int32_t p = m_Parents[cursor];
+  const VComputeSegment* parent = p < 0 ? nullptr : &m_Tree[size_t(p)];
+  if (type < EChainOnly) segment.UpdatePose(params.data(), parent);
+  if (type != ENone) segment.UpdateJacobian(params.data(), parent, type);
+}
+
 void VComputeSubject::UpdateSegments(ConstView state, std::uint32_t type) {
   const bool same = !m_FirstTime && state.size() >= m_Cache.size() &&
                     std::equal(m_Cache.begin(), m_Cache.end(), state.begin());
   if (same && type == ENone) return;
   // An unchanged state only needs the Jacobians asked for.
   const std::uint32_t effective = (same && type < EChainOnly) ? type + 3 : type;
-  const bool poses = effective < EChainOnly;
-  const double* params = state.data();
-  for (VComputeSegment& segment : m_Segments) {
-    const VComputeSegment* parent =
-        segment.m_Parent < 0 ? nullptr : &m_Segments[size_t(segment.m_Parent)];
-    const double* own = params + segment.m_FirstParam;
-    if (poses) segment.UpdatePose(own, parent);
-    if (effective != ENone) segment.UpdateJacobian(own, parent, effective);
+  ISegmentComputer& computer = *m_pSegmentComputer;
+  const auto own = [&](const VComputeSegment& s) {
+    return ConstView(state.data() + s.m_FirstParam, s.m_NumParams);
+  };
+  // The default computer, which nearly every subject uses, without a virtual call per segment.
+  if (typeid(computer) == typeid(VSegmentComputerImpl)) {
+    auto& impl = static_cast<VSegmentComputerImpl&>(computer);
+    for (std::uint32_t i = 0; i < m_Segments.size(); ++i)
+      impl.VSegmentComputerImpl::Update(i, own(m_Segments[i]), effective);
+  } else {
+    for (std::uint32_t i = 0; i < m_Segments.size(); ++i)
+      computer.Update(i, own(m_Segments[i]), effective);
   }
-  if (poses) {
+  // The target computer does nothing for an "only" type: the poses are those of the cache.
+  m_pTargetComputer->UpdateTargets(m_PlainTargets, effective);
+  if (!m_ParamTargets.empty())
+    m_pTargetComputer->UpdateParametrisedTargets(m_ParamTargets, state.first(m_NumJointParams),
+                                                 state.subspan(m_NumJointParams), effective);
+  if (effective < EChainOnly) {
     ++m_PoseEvaluations;
-    for (auto& target : m_Targets)
-      target->Update();
     m_FirstTime = false;
     std::copy_n(state.begin(), m_Cache.size(), m_Cache.begin());
   }
 }
 
-void VComputeSubject::UpdateTargets(ConstView) {
-  for (auto& target : m_Targets)
-    target->Update();
+void VComputeSubject::UpdateTargets(ConstView state) {
+  m_pTargetComputer->UpdateTargets(m_PlainTargets, ENone);
+  if (!m_ParamTargets.empty())
+    m_pTargetComputer->UpdateParametrisedTargets(m_ParamTargets, state.first(m_NumJointParams),
+                                                 state.subspan(m_NumJointParams), ENone);
+}
+
+void VComputeSubject::GatherTargetParams(View o_rState) const {
+  m_pTargetComputer->GatherTargetParams(m_ParamTargets, o_rState.subspan(m_NumJointParams));
 }
 
 void VComputeSubject::TargetJacobian(Eigen::Ref<Eigen::MatrixXd> o_rJacobian) const {
@@ -298,6 +335,22 @@ bool VComputeSubject::ReloadFromModel(std::string* o_pWhy) {
   for (std::uint32_t t = 0; t < m_pSubject->NumTargets(); ++t)
     if (m_pSubject->Target(t) != m_ModelTargets[t])
       return fail("the model's target " + std::to_string(t) + " was replaced");
+  // The factory is asked again which targets have a run-time form, and of which class; the
+  // subject's own targets are then rebound in place, so references to them and their run-time
+  // settings (member weights) survive.
+  size_t held = 0;
+  for (std::uint32_t t = 0; t < m_pSubject->NumTargets(); ++t) {
+    const std::unique_ptr<IComputeTarget> fresh =
+        m_pTargetFactory->Create(*m_pSubject->Target(t), Lookup());
+    const bool wasHeld = held < m_TargetModelIndex.size() && m_TargetModelIndex[held] == t;
+    if (!fresh && !wasHeld) continue;
+    const IComputeTarget* made = fresh.get();
+    const IComputeTarget* kept = wasHeld ? m_Targets[held].get() : nullptr;
+    if (!made || !kept || typeid(*made) != typeid(*kept))
+      return fail("the target factory now gives another run-time form for target " +
+                  std::to_string(t));
+    ++held;
+  }
   for (VComputeSegment& s : m_Segments)
     s.Reload();
   for (auto& target : m_Targets) {
@@ -336,6 +389,8 @@ void VComputeSubject::BuildChain(std::uint32_t index, VTgtChainInfo& o_rInfo) co
   const VComputeSegment* parent = &o_rInfo.m_Chain.back();
   o_rInfo.m_pTarget = m_pTargetFactory->Create(m_Targets[index]->Target(),
                                                [parent](std::uint32_t) { return parent; });
+  o_rInfo.m_pComputer = m_pSegmentComputer->Clone();
+  o_rInfo.m_pComputer->SetTree(o_rInfo.m_Chain);
 }
 
 VComputeSubject::VTgtChainInfo* VComputeSubject::Chain(std::uint32_t index) {
@@ -361,13 +416,9 @@ const IComputeTarget& VComputeSubject::UpdateTarget(std::uint32_t index, ConstVi
   double* compact = info->m_State.data();
   for (const auto& [first, end] : info->m_Runs)
     compact = std::copy(state.begin() + first, state.begin() + end, compact);
-  const bool poses = type < EChainOnly;
-  for (size_t k = 0; k < info->m_Chain.size(); ++k) {
-    VComputeSegment& segment = info->m_Chain[k];
-    const VComputeSegment* parent = k ? &info->m_Chain[k - 1] : nullptr;
+  for (std::uint32_t k = 0; k < info->m_Chain.size(); ++k) {
     const double* own = info->m_State.data() + info->m_Offsets[k];
-    if (poses) segment.UpdatePose(own, parent);
-    if (type != ENone) segment.UpdateJacobian(own, parent, type);
+    info->m_pComputer->Update(k, ConstView(own, info->m_Chain[k].NumParams()), type);
   }
   info->m_pTarget->Update();
   return *info->m_pTarget;

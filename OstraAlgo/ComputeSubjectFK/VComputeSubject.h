@@ -15,6 +15,7 @@
 #include <map>
 #include <memory>
 #include <random>
+#include <span>
 #include <utility>
 #include <vector>
 
@@ -36,6 +37,42 @@ public:
     virtual ~ITargetFactory() = default;
     virtual std::unique_ptr<IComputeTarget> Create(const KinematicAlgo::ITargetCalibrated& target,
                                                    const SegmentLookup& lookup) const = 0;
+  };
+
+  /// Evaluates the segments of a tree one at a time. The tree is a list of segments in which
+  /// each segment's parent (found by its Index()) comes before it: the subject's segments in
+  /// pre-order, or a target chain's copies. A cursor is a position in that list.
+  class ISegmentComputer {
+  public:
+    virtual ~ISegmentComputer() = default;
+    /// A computer of the same kind and settings, attached to no tree.
+    virtual std::unique_ptr<ISegmentComputer> Clone() const = 0;
+    /// The segment's share of the joint state.
+    virtual std::uint32_t NumParams(const VComputeSegment& segment) const = 0;
+    /// Attaches the computer to `tree`, which must outlive its use and keep its size.
+    virtual void SetTree(std::span<VComputeSegment> tree) = 0;
+    /// Pose (type below EChainOnly) and Jacobian blocks of `type` of the segment at `cursor`,
+    /// from its own parameters; its parent is current.
+    virtual void Update(std::uint32_t cursor, ConstView params, std::uint32_t type) = 0;
+    /// Gives the segment at `cursor` its first parameter and room for Jacobians up to `type`,
+    /// once, before any Update.
+    virtual void SetUp(std::uint32_t cursor, std::uint32_t firstParam, std::uint32_t type) = 0;
+  };
+  /// Brings targets up to date after their segments moved. A type of EChainOnly or above means
+  /// the poses did not change, so there is nothing to do for targets that follow poses.
+  class ITargetComputer {
+  public:
+    virtual ~ITargetComputer() = default;
+    /// Targets without parameters of their own.
+    virtual void UpdateTargets(std::span<IComputeTarget* const> targets,
+                               std::uint32_t type) const = 0;
+    /// Targets with parameters: `targetState` holds theirs one after another in list order.
+    virtual void UpdateParametrisedTargets(std::span<IComputeTarget* const> targets,
+                                           ConstView jointState, ConstView targetState,
+                                           std::uint32_t type) const = 0;
+    /// Writes the targets' current parameters into `o_rState`, one after another.
+    virtual void GatherTargetParams(std::span<IComputeTarget* const> targets,
+                                    View o_rState) const = 0;
   };
 
   virtual ~IComputeSubject() = default;
@@ -79,6 +116,31 @@ public:
                                            const SegmentLookup& lookup) const override;
   };
 
+  /// The default segment computer: forward kinematics and the Jacobian blocks of every type,
+  /// for joint-driven and free segments alike (a free segment's joint is its free transform).
+  class VSegmentComputerImpl : public ISegmentComputer {
+  public:
+    std::unique_ptr<ISegmentComputer> Clone() const override;
+    std::uint32_t NumParams(const VComputeSegment& segment) const override;
+    void SetTree(std::span<VComputeSegment> tree) override;
+    void Update(std::uint32_t cursor, ConstView params, std::uint32_t type) override;
+    void SetUp(std::uint32_t cursor, std::uint32_t firstParam, std::uint32_t type) override;
+
+  private:
+    std::span<VComputeSegment> m_Tree;
+    /// Each segment's parent as a position in m_Tree, -1 at a root.
+    std::vector<std::int32_t> m_Parents;
+  };
+  /// The default target computer: every target follows its segments; parametrised targets
+  /// take their slice of the target state first.
+  class VTargetComputer : public ITargetComputer {
+  public:
+    void UpdateTargets(std::span<IComputeTarget* const> targets, std::uint32_t type) const override;
+    void UpdateParametrisedTargets(std::span<IComputeTarget* const> targets, ConstView jointState,
+                                   ConstView targetState, std::uint32_t type) const override;
+    void GatherTargetParams(std::span<IComputeTarget* const> targets, View o_rState) const override;
+  };
+
   /// `ignored` is kept for callers that pass it and changes nothing. `mode` EFreeSegmentsMode
   /// places every segment by six free parameters (the state is then six per segment in tree
   /// order, see VComputeSegment); any other value uses the joints. `useRotator` as for
@@ -87,11 +149,15 @@ public:
   explicit VComputeSubject(std::shared_ptr<const KinematicAlgo::ISubjectCalibrated> subject,
                            std::uint8_t ignored = 0, std::uint32_t mode = 1,
                            std::uint32_t useRotator = 0);
-  /// As above with the given factories; a null one is replaced by the default (a null segment
-  /// factory by VSegmentFactory without the rotator). Copies share the factories.
+  /// As above with the given factories and computers; a null one is replaced by the default (a
+  /// null segment factory by VSegmentFactory without the rotator). The segment computer is
+  /// attached to this subject's tree, so it must not be given to another subject; copies share
+  /// the factories and the target computer and clone the segment computer.
   VComputeSubject(std::shared_ptr<const KinematicAlgo::ISubjectCalibrated> subject,
                   std::uint32_t mode, std::shared_ptr<const ISegmentFactory> segmentFactory,
-                  std::shared_ptr<const ITargetFactory> targetFactory);
+                  std::shared_ptr<const ITargetFactory> targetFactory,
+                  std::shared_ptr<ISegmentComputer> segmentComputer = nullptr,
+                  std::shared_ptr<const ITargetComputer> targetComputer = nullptr);
   /// Independent copy: segments and targets are rebuilt, targets follow the copy's segments.
   VComputeSubject(const VComputeSubject& other);
   VComputeSubject& operator=(const VComputeSubject&) = delete;
@@ -109,12 +175,17 @@ public:
   std::uint32_t Mode() const { return m_Mode; }
   const ISegmentFactory& SegmentFactory() const { return *m_pSegmentFactory; }
   const ITargetFactory& TargetFactory() const { return *m_pTargetFactory; }
+  const ISegmentComputer& SegmentComputer() const { return *m_pSegmentComputer; }
+  const ITargetComputer& TargetComputer() const { return *m_pTargetComputer; }
   /// How many times forward kinematics has run over the tree (for callers that check caching).
   std::uint64_t NumPoseEvaluations() const { return m_PoseEvaluations; }
 
   void Update(ConstView state) override { UpdateSegments(state, ENone); }
   void UpdateSegments(ConstView state, std::uint32_t type) override;
   void UpdateTargets(ConstView state) override;
+  /// Writes the parametrised targets' current parameters into the target part of `o_rState`
+  /// (NumParams() values).
+  void GatherTargetParams(View o_rState) const;
 
   /// The dense Jacobian of all position targets' world positions (3 rows each, in target
   /// order, zero rows for other targets) with respect to the joint state, from the blocks of
@@ -180,6 +251,8 @@ public:
     std::vector<double> m_State;
     /// The target, bound to m_Chain.back().
     std::unique_ptr<IComputeTarget> m_pTarget;
+    /// A clone of the subject's segment computer, attached to m_Chain.
+    std::unique_ptr<ISegmentComputer> m_pComputer;
   };
 
   /// Evaluates target `index` alone: forward kinematics (and Jacobian blocks of `type`) of the
@@ -208,7 +281,12 @@ private:
   std::shared_ptr<const ISegmentFactory> m_pSegmentFactory;
   std::shared_ptr<const ITargetFactory> m_pTargetFactory;
   std::vector<VComputeSegment> m_Segments;
+  std::shared_ptr<ISegmentComputer> m_pSegmentComputer;
+  std::shared_ptr<const ITargetComputer> m_pTargetComputer;
   std::vector<std::unique_ptr<IComputeTarget>> m_Targets;
+  /// m_Targets split by whether they have parameters, each in model order.
+  std::vector<IComputeTarget*> m_PlainTargets;
+  std::vector<IComputeTarget*> m_ParamTargets;
   /// Each run-time target's position in the model's target list (targets without a run-time
   /// form are dropped, so the two lists differ).
   std::vector<std::uint32_t> m_TargetModelIndex;

@@ -29,6 +29,10 @@ public:
   virtual std::uint32_t NumParams() const = 0;
   /// Recomputes the world quantity from the parent's current pose.
   virtual void Update() = 0;
+  /// Takes and gives the target's own parameters (NumParams() values); a kind with parameters
+  /// overrides both, the others have nothing to move.
+  virtual void SetParams(ConstView) {}
+  virtual void GetParams(View) const {}
   /// Reads the model target's geometry again and binds to `parent` (null: unbound). Settings
   /// of the run-time target that the model does not hold (member weights) are kept where they
   /// still apply.
