@@ -66,34 +66,38 @@ TEST(FlowItem, VariableItemSizeIsWhatWriteProducesAndReadsBack) {
 }
 
 /// Every field kind a fixed layout allows: bools (alone and in an array), an enum, packed numbers
-/// and a nested class.
-struct VFixedKinds {
-  static constexpr const char* FlowClassName = "FixedKinds";
+/// and nested classes.
+struct VFlags {
+  static constexpr const char* FlowClassName = "Flags";
   bool m_On = true;
   EKind m_Kind = EKind::Marker;
-  std::array<float, 3> m_Scale{1, 2, 3};
   std::array<bool, 3> m_Bits{true, false, true};
-  std::int16_t m_Small = -3;
-  VPoint m_Point{4, 5, 6, 9};
   template <class S, class V> static void FlowFields(S& s, V&& v) {
     v("On", "", s.m_On);
     v("Kind", "", s.m_Kind);
-    v("Scale", "", s.m_Scale);
     v("Bits", "", s.m_Bits);
-    v("Small", "", s.m_Small);
-    v("Point", "", s.m_Point);
   }
 };
-struct VFlowFixedKinds : VFixedKinds {
+/// Its own item type: the type's statics beside the fields.
+struct VFixedKinds {
+  static constexpr const char* FlowClassName = "FixedKinds";
   static constexpr const char* FlowTypeName = "FlowFixedKinds";
   static constexpr std::uint32_t FlowTypeId = 190;
   static constexpr ZMT::IFlowItemVersion FlowVersion{1, 0, 0};
+  VFlags m_Flags;
+  std::array<float, 3> m_Scale{1, 2, 3};
+  VPoint m_Point{4, 5, 6, 9};
+  template <class S, class V> static void FlowFields(S& s, V&& v) {
+    v("Flags", "", s.m_Flags);
+    v("Scale", "", s.m_Scale);
+    v("Point", "", s.m_Point);
+  }
 };
 
 TEST(FlowItem, AFixedLayoutIsPutWithTheBytesWriteGives) {
-  ZMT::Detail::VFlowItem<VFlowFixedKinds> kinds;
-  kinds.m_On = false;
-  kinds.m_Bits[1] = true;
+  ZMT::Detail::VFlowItem<VFixedKinds> kinds;
+  kinds.m_Flags.m_On = false;
+  kinds.m_Flags.m_Bits[1] = true;
   kinds.m_Point.m_Quality = 0x0A0B0C0D;
   PointItem point;
   point.m_Y = -0.25;
@@ -108,7 +112,7 @@ TEST(FlowItem, AFixedLayoutIsPutWithTheBytesWriteGives) {
     put.pop_back();
     EXPECT_EQ(put, out.m_Bytes);
   }
-  EXPECT_EQ(kinds.GetFixedSize(), 1u + 2 + 12 + 3 + 2 + 28);
+  EXPECT_EQ(kinds.GetFixedSize(), 1u + 2 + 3 + 12 + 28);
   // Strings, vectors and maps make the size depend on the value.
   EXPECT_EQ(EventItem().GetFixedSize(), 0u);
   EXPECT_EQ(FilledMixed().GetFixedSize(), 0u);
