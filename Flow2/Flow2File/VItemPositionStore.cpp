@@ -53,13 +53,11 @@ void VItemPositionStore::Unhook(VList& io_rList, VItemPosition* i_pEntry) {
 }
 
 void VItemPositionStore::RemoveFromBucket(VItemPosition* i_pEntry) {
-  for (VItemPosition** ppLink = Bucket(i_pEntry->m_Token); *ppLink;
-       ppLink = &(*ppLink)->m_pBucketNext)
-    if (*ppLink == i_pEntry) {
-      *ppLink = i_pEntry->m_pBucketNext;
-      i_pEntry->m_pBucketNext = nullptr;
-      return;
-    }
+  *i_pEntry->m_ppBucketLink = i_pEntry->m_pBucketNext;
+  if (i_pEntry->m_pBucketNext) i_pEntry->m_pBucketNext->m_ppBucketLink = i_pEntry->m_ppBucketLink;
+  i_pEntry->m_pBucketNext = nullptr;
+  i_pEntry->m_ppBucketLink = nullptr;
+  // The entry may head the bucket a pending Record would insert into; that pointer stays good.
 }
 
 VItemPositionStore::VListPair& VItemPositionStore::Lists(std::uint32_t typeId) {
@@ -72,10 +70,15 @@ VItemPositionStore::VListPair& VItemPositionStore::Lists(std::uint32_t typeId) {
 }
 
 bool VItemPositionStore::Find(const ZMT::IFlowItemToken& token, std::uint64_t& o_rPosition) {
-  VItemPosition* pEntry = *Bucket(token);
+  VItemPosition** ppBucket = Bucket(token);
+  VItemPosition* pEntry = *ppBucket;
   while (pEntry && !(pEntry->m_Token == token))
     pEntry = pEntry->m_pBucketNext;
-  if (!pEntry) return false;
+  if (!pEntry) {
+    m_ppMissBucket = ppBucket;
+    m_MissToken = token;
+    return false;
+  }
   if (pEntry->m_Generation != Permanent && pEntry->m_Generation != m_Generation) {
     VListPair& lists = Lists(token.m_TypeId);
     Unhook(lists.m_Previous, pEntry);
@@ -88,10 +91,17 @@ bool VItemPositionStore::Find(const ZMT::IFlowItemToken& token, std::uint64_t& o
 
 void VItemPositionStore::Record(const ZMT::IFlowItemToken& token, std::uint64_t position,
                                 bool permanent) {
-  VItemPosition** ppBucket = Bucket(token);
-  VItemPosition* pFound = *ppBucket;
-  while (pFound && !(pFound->m_Token == token))
-    pFound = pFound->m_pBucketNext;
+  VItemPosition** ppBucket = nullptr;
+  VItemPosition* pFound = nullptr;
+  if (m_ppMissBucket && m_MissToken == token) {
+    ppBucket = m_ppMissBucket; // Find has just looked: the token has no entry
+  } else {
+    ppBucket = Bucket(token);
+    pFound = *ppBucket;
+    while (pFound && !(pFound->m_Token == token))
+      pFound = pFound->m_pBucketNext;
+  }
+  m_ppMissBucket = nullptr;
   if (pFound && !permanent) return;
   if (pFound) {
     if (pFound->m_Generation != Permanent) {
@@ -111,6 +121,8 @@ void VItemPositionStore::Record(const ZMT::IFlowItemToken& token, std::uint64_t 
     Push(Lists(token.m_TypeId).m_Current, pEntry);
   }
   pEntry->m_pBucketNext = *ppBucket;
+  pEntry->m_ppBucketLink = ppBucket;
+  if (*ppBucket) (*ppBucket)->m_ppBucketLink = &pEntry->m_pBucketNext;
   *ppBucket = pEntry;
 }
 
@@ -132,6 +144,7 @@ void VItemPositionStore::Clear() {
   m_Lists.clear();
   m_pLastLists = nullptr;
   m_pFree = nullptr;
+  m_ppMissBucket = nullptr;
   m_Blocks.clear();
   m_Generation = 0;
   m_Size = 0;

@@ -43,6 +43,8 @@ private:
     std::uint64_t m_Position = 0;
     std::uint64_t m_Generation = 0;
     VItemPosition* m_pBucketNext = nullptr;
+    /// The link that points at this entry (a bucket or the entry before), so it leaves in O(1).
+    VItemPosition** m_ppBucketLink = nullptr;
     VItemPosition* m_pPrev = nullptr;
     VItemPosition* m_pNext = nullptr;
   };
@@ -69,6 +71,9 @@ private:
   std::uint32_t m_LastListsType = 0;
   std::vector<std::unique_ptr<VItemPosition[]>> m_Blocks;
   VItemPosition* m_pFree = nullptr;
+  /// The bucket of the token Find missed last: a new item is looked for, then recorded.
+  VItemPosition** m_ppMissBucket = nullptr;
+  ZMT::IFlowItemToken m_MissToken;
   std::uint64_t m_Generation = 0;
   std::size_t m_Size = 0;
 };

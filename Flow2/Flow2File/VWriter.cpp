@@ -1,5 +1,7 @@
 #include "Flow2/Flow2File/VWriter.h"
 
+#include "Flow2/Flow2Store/VFlowBuffers.h"
+
 #include <cerrno>
 
 namespace Flow2File {
@@ -284,13 +286,22 @@ IResult VWriter::BodyPieces(const ZMT::IFlowItemHandle& item, ZMT::VGatherList& 
 }
 
 IResult VWriter::AddBody(const ZMT::IFlowItemHandle& item) {
+  constexpr std::uint64_t Head = Format::ChunkHeaderSize + 4;
+  if (m_Group.m_FixedSize == UnknownSize) m_Group.m_FixedSize = item->GetFixedSize();
+  // A body of fixed size goes straight into the page with its chunk header: one reservation and
+  // one call, no stream write per field.
+  const bool fixed = !m_UseStoreBuffers && m_Group.m_FixedSize != 0 &&
+                     m_Group.m_FixedSize <= Flow2Store::VFlowBufferFixed::Capacity - Head;
   void* pHeader = nullptr;
-  if (m_Bodies.GetScratch(pHeader, Format::ChunkHeaderSize + 4) != Format::ChunkHeaderSize + 4)
-    return IResult::AllocationFailure;
+  const std::uint64_t reserve = fixed ? Head + m_Group.m_FixedSize : Head;
+  if (m_Bodies.GetScratch(pHeader, reserve) != reserve) return IResult::AllocationFailure;
   std::uint64_t size = 0;
   bool shared = false;
-  if (m_UseStoreBuffers) {
-    m_BodyGather.emplace_back(pHeader, Format::ChunkHeaderSize + 4);
+  if (fixed) {
+    item->WriteFixed(static_cast<std::uint8_t*>(pHeader) + Head);
+    size = m_Group.m_FixedSize;
+  } else if (m_UseStoreBuffers) {
+    m_BodyGather.emplace_back(pHeader, Head);
     const IResult result = BodyPieces(item, m_BodyGather, size, shared);
     if (result.IsFailure()) return result;
   } else {
@@ -311,7 +322,7 @@ IResult VWriter::AddBody(const ZMT::IFlowItemHandle& item) {
   std::memcpy(pBytes + Format::ChunkHeaderSize, &itemId, 4);
 
   m_Positions.Record(item.GetToken(), m_Position + m_BodyOffset, false);
-  const std::uint64_t chunk = Format::ChunkHeaderSize + 4 + size;
+  const std::uint64_t chunk = Head + size;
   m_BodyOffset += static_cast<std::uint32_t>(chunk);
   m_BodyBytes += chunk;
   return IResult::Ok;
@@ -401,12 +412,20 @@ IResult VWriter::WriteState(const ZMT::IFlowState& state) {
   if (m_pSeekable) m_PendingIndex.emplace_back(tick, statePosition);
 
   m_Group = VPendingGroup();
+  // Records come sorted by type: the file type id is looked up once per run.
+  std::int64_t mappedType = LeftOut;
+  first = true;
   for (std::size_t i = 0; i < records; ++i) {
     const ZMT::VFlowStateRecord& record = state.GetRecord(i);
-    auto mapped = m_WrittenTypes.find(record.m_Token.m_TypeId);
-    if (mapped == m_WrittenTypes.end()) return IResult::Failed;
-    if (mapped->second < 0) continue;
-    const auto fileTypeId = static_cast<std::uint32_t>(mapped->second);
+    if (first || record.m_Token.m_TypeId != lastType) {
+      auto mapped = m_WrittenTypes.find(record.m_Token.m_TypeId);
+      if (mapped == m_WrittenTypes.end()) return IResult::Failed;
+      mappedType = mapped->second;
+      lastType = record.m_Token.m_TypeId;
+      first = false;
+    }
+    if (mappedType < 0) continue;
+    const auto fileTypeId = static_cast<std::uint32_t>(mappedType);
     const ZMT::VFlowTimestamp itemTime =
         record.m_Time == time ? ZMT::VFlowTimestamp() : record.m_Time;
     std::uint64_t position = 0;
@@ -416,8 +435,8 @@ IResult VWriter::WriteState(const ZMT::IFlowState& state) {
         m_Group.m_ByReference != byReference) {
       result = FlushGroup();
       if (result.IsFailure()) return result;
-      m_Group =
-          VPendingGroup{true, fileTypeId, record.m_Token.m_FlowStoreId, itemTime, byReference, 0};
+      m_Group = VPendingGroup{true, fileTypeId, record.m_Token.m_FlowStoreId, itemTime, byReference,
+                              0,    UnknownSize};
       m_BodyOffset = itemTime.IsEmpty() ? Format::GroupSize : Format::GroupSizeWithTime;
     }
     if (byReference) {

@@ -73,7 +73,11 @@ private:
     ZMT::VFlowTimestamp m_Time;
     bool m_ByReference = false;
     std::uint32_t m_Count = 0;
+    /// The bodies' size when the group's type has a fixed layout, 0 when not; asked of the first
+    /// item (one store's items of one type are of one class).
+    std::uint64_t m_FixedSize = UnknownSize;
   };
+  static constexpr std::uint64_t UnknownSize = ~std::uint64_t(0);
 
   ZMT::IOutputStream* Stream() const;
   ZMT::IResult OpenCommon(std::uint64_t start);

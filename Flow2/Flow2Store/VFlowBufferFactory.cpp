@@ -11,6 +11,7 @@ using ZMT::IResult;
 VFlowBufferFactory::VFlowBufferFactory(std::pmr::memory_resource* i_pAllocator)
     : m_pAllocator(i_pAllocator ? i_pAllocator : std::pmr::new_delete_resource()),
       m_Pages([this] { return new VFlowBufferFixed(this); }),
+      m_SmallPages([this] { return new VFlowBufferSmall(this); }),
       m_SharedPages([this] { return new VFlowBufferShared(this); }) {}
 
 VFlowBufferFactory::~VFlowBufferFactory() = default;
@@ -26,6 +27,13 @@ ZMT::IFlowBuffer* VFlowBufferFactory::AllocatePage() {
 }
 
 ZMT::IFlowBuffer* VFlowBufferFactory::AllocateChain(std::uint64_t size) {
+  if (size <= VFlowBufferSmall::Capacity) {
+    // Most item bodies are small and live as long as their item: a small page holds one.
+    VFlowBufferSmall* pPage = m_SmallPages.Get();
+    AddReference();
+    pPage->SetSize(size);
+    return pPage;
+  }
   ZMT::IFlowBuffer* pHead = nullptr;
   ZMT::IFlowBuffer* pTail = nullptr;
   try {
@@ -66,6 +74,11 @@ std::shared_ptr<ZMT::IBuffer> VFlowBufferFactory::AllocateStandard(std::uint64_t
 
 void VFlowBufferFactory::ReturnPage(VFlowBufferFixed* i_pPage) {
   m_Pages.Return(i_pPage);
+  DropReference(); // may delete this
+}
+
+void VFlowBufferFactory::ReturnPage(VFlowBufferSmall* i_pPage) {
+  m_SmallPages.Return(i_pPage);
   DropReference(); // may delete this
 }
 

@@ -37,12 +37,14 @@ public:
 
   /// Called by pages when released. Every page handed out holds a reference to the factory.
   void ReturnPage(VFlowBufferFixed* i_pPage);
+  void ReturnPage(VFlowBufferSmall* i_pPage);
   void ReturnShared(VFlowBufferShared* i_pPage);
 
 private:
   std::pmr::memory_resource* m_pAllocator;
   std::atomic<std::uint32_t> m_RefCount{0};
   Detail::VObjectPool<VFlowBufferFixed> m_Pages;
+  Detail::VObjectPool<VFlowBufferSmall> m_SmallPages;
   Detail::VObjectPool<VFlowBufferShared> m_SharedPages;
 };
 

@@ -29,7 +29,7 @@ void VFlowBufferCommon::ReleaseChain() {
   }
 }
 
-void VFlowBufferFixed::Release() {
+template <std::uint64_t N> void VFlowBufferInline<N>::Release() {
   Reset();
   if (m_pFactory)
     m_pFactory->ReturnPage(this);
@@ -37,11 +37,8 @@ void VFlowBufferFixed::Release() {
     delete this;
 }
 
-bool VFlowBufferFixed::SetSize(std::uint64_t size) {
-  if (size > Capacity) return false;
-  m_Size = size;
-  return true;
-}
+template class VFlowBufferInline<4096>;
+template class VFlowBufferInline<224>;
 
 void VFlowBufferShared::Release() {
   Reset();

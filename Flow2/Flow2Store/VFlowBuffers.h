@@ -27,19 +27,23 @@ protected:
   ZMT::IFlowBuffer* m_pNext = nullptr;
 };
 
-/// A page of 4096 bytes held inline.
-class VFlowBufferFixed final : public VFlowBufferCommon {
+/// A page of N bytes held inline.
+template <std::uint64_t N> class VFlowBufferInline final : public VFlowBufferCommon {
 public:
-  static constexpr std::uint64_t Capacity = 4096;
+  static constexpr std::uint64_t Capacity = N;
 
-  explicit VFlowBufferFixed(VFlowBufferFactory* i_pFactory) : m_pFactory(i_pFactory) {}
+  explicit VFlowBufferInline(VFlowBufferFactory* i_pFactory) : m_pFactory(i_pFactory) {}
 
   const std::uint8_t* GetData() const override { return m_Data; }
   std::uint64_t GetSize() const override { return m_Size; }
   std::uint64_t GetCapacity() const override { return Capacity; }
   std::shared_ptr<const ZMT::IBufferConst> GetSharedBuffer() const override { return nullptr; }
   void Release() override;
-  bool SetSize(std::uint64_t size) override;
+  bool SetSize(std::uint64_t size) override {
+    if (size > Capacity) return false;
+    m_Size = size;
+    return true;
+  }
   std::uint8_t* GetMutableData() override { return m_Data; }
 
   /// Back to an empty unlinked page.
@@ -49,10 +53,19 @@ public:
   }
 
 private:
+  // The header first: taking and returning a page touches one cache line.
   std::uint64_t m_Size = 0;
-  std::uint8_t m_Data[Capacity];
   VFlowBufferFactory* m_pFactory;
+  std::uint8_t m_Data[Capacity];
 };
+
+/// The page streams fill.
+using VFlowBufferFixed = VFlowBufferInline<4096>;
+/// A page for a body that fits 224 bytes (the page is 256): a chain of small items' bodies, kept
+/// by the store with each item, then takes a few cache lines instead of a whole page.
+using VFlowBufferSmall = VFlowBufferInline<224>;
+extern template class VFlowBufferInline<4096>;
+extern template class VFlowBufferInline<224>;
 
 /// A page presenting the bytes of a shared buffer.
 class VFlowBufferShared final : public VFlowBufferCommon {

@@ -59,6 +59,7 @@ class IFlowBufferFactory {
 public:
   virtual ~IFlowBufferFactory() = default;
   /// Pages enough for `size` bytes, each full but the last; one page for at most a page's worth.
+  /// A page's capacity may be smaller than a stream's page when the whole size fits it.
   virtual IFlowBuffer* AllocateChain(std::uint64_t size) = 0;
   virtual IFlowBuffer* AllocatePage() = 0;
   /// A page that presents the bytes of a shared buffer.

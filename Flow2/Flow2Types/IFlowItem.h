@@ -24,6 +24,10 @@ public:
   virtual bool Write(IOutputStream& io_rStream) const = 0;
   /// The number of bytes Write produces.
   virtual std::uint64_t GetSize() const = 0;
+  /// The bytes Write produces when every item of this type takes the same number, else 0.
+  virtual std::uint64_t GetFixedSize() const { return 0; }
+  /// For a type of fixed size: puts the bytes Write produces at `p` (GetFixedSize() of room).
+  virtual void WriteFixed(std::uint8_t* /*p*/) const {}
 };
 
 /// An item that is also a value of the data class T.

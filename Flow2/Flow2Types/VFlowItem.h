@@ -10,6 +10,7 @@
 
 #include "Flow2/Flow2Types/FlowCompile.h"
 #include "Flow2/Flow2Types/FlowFieldTraits.h"
+#include "Flow2/Flow2Types/FlowFixedLayout.h"
 #include "Flow2/Flow2Types/IFlowItem.h"
 #include "Flow2/Flow2Types/IFlowItemFactory.h"
 #include "Flow2/Flow2Types/VItemBlockPool.h"
@@ -46,6 +47,14 @@ public:
       return false;
   }
   bool Read(IInputStream& io_rStream) override {
+    const std::uint64_t fixed = FixedSize<T>();
+    if (fixed != 0 && fixed <= MaxFixedRead) {
+      // One read for the whole body instead of one per field.
+      std::uint8_t bytes[MaxFixedRead];
+      if (!io_rStream.Read(bytes, fixed)) return false;
+      TakeFixed(bytes, static_cast<T&>(*this));
+      return true;
+    }
     return TFlowField<T>::Read(io_rStream, static_cast<T&>(*this));
   }
   bool Write(IOutputStream& io_rStream) const override {
@@ -54,6 +63,8 @@ public:
   std::uint64_t GetSize() const override {
     return TFlowField<T>::Size(static_cast<const T&>(*this));
   }
+  std::uint64_t GetFixedSize() const override { return FixedSize<T>(); }
+  void WriteFixed(std::uint8_t* p) const override { PutFixed(p, static_cast<const T&>(*this)); }
 
   static void* operator new(std::size_t size) {
     if (size != sizeof(VFlowItem)) return ::operator new(size);

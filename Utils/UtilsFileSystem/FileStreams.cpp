@@ -50,34 +50,13 @@ ZMT::IResult VFileInputStream::Close() {
   return CloseFile(std::exchange(m_pFile, nullptr));
 }
 
-bool IOutputStreamSeekableOwningAdapter<VFileOutputStream>::WriteLocked(const void* pBuffer,
-                                                                        std::uint64_t size) {
-  std::FILE* pFile = m_Stream.File();
-  const auto* pBytes = static_cast<const std::uint8_t*>(pBuffer);
-  if (m_Realign) {
-    const std::uint64_t boundary = (m_Position / FullBufferSize + 1) * FullBufferSize;
-    if (m_Position + size < boundary) {
-      m_Position += size;
-    } else {
-      const std::uint64_t head = boundary - m_Position;
-      if (head && ::fwrite_unlocked(pBytes, static_cast<std::size_t>(head), 1, pFile) != 1)
-        return false;
-      if (::fflush_unlocked(pFile) != 0) return false;
-      m_Realign = false;
-      pBytes += head;
-      size -= head;
-    }
-  }
-  return size == 0 || ::fwrite_unlocked(pBytes, static_cast<std::size_t>(size), 1, pFile) == 1;
-}
-
 bool IOutputStreamSeekableOwningAdapter<VFileOutputStream>::Write(const void* pBuffer,
                                                                   std::uint64_t size) {
   std::FILE* pFile = m_Stream.File();
   if (!pFile) return false;
   if (size == 0) return true;
   ::flockfile(pFile);
-  const bool ok = WriteLocked(pBuffer, size);
+  const bool ok = m_Aligned.WriteLocked(pFile, pBuffer, size);
   ::funlockfile(pFile);
   return ok;
 }
@@ -88,7 +67,7 @@ bool IOutputStreamSeekableOwningAdapter<VFileOutputStream>::Write(const ZMT::VGa
   bool ok = true;
   ::flockfile(pFile);
   for (const auto& [pData, size] : pieces)
-    if (size && !WriteLocked(pData, size)) {
+    if (size && !m_Aligned.WriteLocked(pFile, pData, size)) {
       ok = false;
       break;
     }
@@ -98,8 +77,7 @@ bool IOutputStreamSeekableOwningAdapter<VFileOutputStream>::Write(const ZMT::VGa
 
 bool IOutputStreamSeekableOwningAdapter<VFileOutputStream>::Seek(std::int64_t position) {
   if (!VFileSeekable::Seek(position)) return false;
-  m_Position = static_cast<std::uint64_t>(position);
-  m_Realign = m_Position % FullBufferSize != 0;
+  m_Aligned.Seeked(static_cast<std::uint64_t>(position));
   return true;
 }
 

@@ -1,6 +1,7 @@
 #pragma once
 // Byte streams over C files: the plain owning wrappers and their seekable stream adapters.
 
+#include "Utils/UtilsFileSystem/AlignedWrites.h"
 #include "Utils/UtilsFileSystem/FileIO.h"
 #include "Utils/UtilsFileSystem/Streams.h"
 
@@ -88,13 +89,8 @@ protected:
   std::FILE* SeekableFile() const override { return m_Stream.File(); }
 
 private:
-  /// One piece, the file locked by the caller.
-  bool WriteLocked(const void* pBuffer, std::uint64_t size);
-
   VFileOutputStream m_Stream;
-  /// Where the next byte goes, kept only while a realigning flush is pending.
-  std::uint64_t m_Position = 0;
-  bool m_Realign = false;
+  VAlignedWrites m_Aligned;
 };
 
 template <class TStream> class IInputStreamSeekableOwningAdapter;

@@ -7,7 +7,13 @@
 namespace UtilsFileSystem {
 
 bool VReplacingFileStream::Write(const void* i_pBuffer, std::uint64_t size) {
-  return m_rFile.Write(i_pBuffer, static_cast<std::size_t>(size));
+  std::FILE* pFile = m_rFile.File();
+  if (!pFile || m_rFile.WriteError() != 0) return false;
+  if (size == 0) return true;
+  ::flockfile(pFile);
+  const bool ok = m_Aligned.WriteLocked(pFile, i_pBuffer, size);
+  ::funlockfile(pFile);
+  return ok && m_rFile.WriteError() == 0;
 }
 
 bool VReplacingFileStream::Write(const ZMT::VGatherList& pieces) {
@@ -16,7 +22,7 @@ bool VReplacingFileStream::Write(const ZMT::VGatherList& pieces) {
   bool ok = true;
   ::flockfile(pFile);
   for (const auto& [pData, size] : pieces)
-    if (size && ::fwrite_unlocked(pData, static_cast<std::size_t>(size), 1, pFile) != 1) {
+    if (size && !m_Aligned.WriteLocked(pFile, pData, size)) {
       ok = false;
       break;
     }
@@ -37,7 +43,9 @@ bool VReplacingFileStream::GetPosition(std::uint64_t& o_rPosition) {
 }
 
 bool VReplacingFileStream::Seek(std::int64_t position) {
-  return m_rFile.File() && SeekFile(m_rFile.File(), position, SEEK_SET).IsSuccess();
+  if (!m_rFile.File() || SeekFile(m_rFile.File(), position, SEEK_SET).IsFailure()) return false;
+  m_Aligned.Seeked(static_cast<std::uint64_t>(position));
+  return true;
 }
 
 } // namespace UtilsFileSystem

@@ -52,6 +52,28 @@ TEST_F(FlowBuffers, ChainsHaveFullPagesAndARemainder) {
   pChain->ReleaseChain();
 }
 
+TEST_F(FlowBuffers, ABodyThatFitsASmallPageTakesOneAndGivesItBack) {
+  const std::uint32_t references = m_Factory->GetReferenceCount();
+  ZMT::IFlowBuffer* pSmall = m_Factory->AllocateChain(VFlowBufferSmall::Capacity);
+  ZMT::IFlowBuffer* pLarger = m_Factory->AllocateChain(VFlowBufferSmall::Capacity + 1);
+  EXPECT_EQ(PageSizes(pSmall), (std::vector<std::uint64_t>{VFlowBufferSmall::Capacity}));
+  EXPECT_EQ(pSmall->GetCapacity(), VFlowBufferSmall::Capacity);
+  EXPECT_EQ(pLarger->GetCapacity(), VFlowBufferFixed::Capacity);
+  EXPECT_FALSE(pSmall->SetSize(VFlowBufferSmall::Capacity + 1));
+  std::iota(pSmall->GetMutableData(), pSmall->GetMutableData() + pSmall->GetSize(), 0);
+  EXPECT_EQ(pSmall->GetData()[VFlowBufferSmall::Capacity - 1], VFlowBufferSmall::Capacity - 1);
+  // Each page holds the factory until it goes back.
+  EXPECT_EQ(m_Factory->GetReferenceCount(), references + 2);
+  pSmall->ReleaseChain();
+  pLarger->ReleaseChain();
+  EXPECT_EQ(m_Factory->GetReferenceCount(), references);
+  // A reused small page comes back empty.
+  pSmall = m_Factory->AllocateChain(3);
+  EXPECT_EQ(PageSizes(pSmall), (std::vector<std::uint64_t>{3}));
+  EXPECT_EQ(pSmall->GetNext(), nullptr);
+  pSmall->ReleaseChain();
+}
+
 TEST_F(FlowBuffers, StreamsCrossPageBoundariesBothWays) {
   std::vector<std::uint8_t> data(10001);
   std::iota(data.begin(), data.end(), 0); // wraps every 256

@@ -7,6 +7,7 @@
 #include <cstring>
 #include <functional>
 #include <memory>
+#include <vector>
 
 namespace {
 
@@ -62,6 +63,59 @@ TEST(FlowItem, VariableItemSizeIsWhatWriteProducesAndReadsBack) {
   event.m_Name = "start";
   EXPECT_EQ(event.GetSize(), Serialise(event).size());
   EXPECT_EQ(event.GetSize(), 4u + 5 + 4 + 4 + 8);
+}
+
+/// Every field kind a fixed layout allows: bools (alone and in an array), an enum, packed numbers
+/// and nested classes.
+struct VFlags {
+  static constexpr const char* FlowClassName = "Flags";
+  bool m_On = true;
+  EKind m_Kind = EKind::Marker;
+  std::array<bool, 3> m_Bits{true, false, true};
+  template <class S, class V> static void FlowFields(S& s, V&& v) {
+    v("On", "", s.m_On);
+    v("Kind", "", s.m_Kind);
+    v("Bits", "", s.m_Bits);
+  }
+};
+/// Its own item type: the type's statics beside the fields.
+struct VFixedKinds {
+  static constexpr const char* FlowClassName = "FixedKinds";
+  static constexpr const char* FlowTypeName = "FlowFixedKinds";
+  static constexpr std::uint32_t FlowTypeId = 190;
+  static constexpr ZMT::IFlowItemVersion FlowVersion{1, 0, 0};
+  VFlags m_Flags;
+  std::array<float, 3> m_Scale{1, 2, 3};
+  VPoint m_Point{4, 5, 6, 9};
+  template <class S, class V> static void FlowFields(S& s, V&& v) {
+    v("Flags", "", s.m_Flags);
+    v("Scale", "", s.m_Scale);
+    v("Point", "", s.m_Point);
+  }
+};
+
+TEST(FlowItem, AFixedLayoutIsPutWithTheBytesWriteGives) {
+  ZMT::Detail::VFlowItem<VFixedKinds> kinds;
+  kinds.m_Flags.m_On = false;
+  kinds.m_Flags.m_Bits[1] = true;
+  kinds.m_Point.m_Quality = 0x0A0B0C0D;
+  PointItem point;
+  point.m_Y = -0.25;
+  for (const ZMT::IFlowItem* pItem :
+       {static_cast<const ZMT::IFlowItem*>(&kinds), static_cast<const ZMT::IFlowItem*>(&point)}) {
+    VBytesOut out;
+    ASSERT_TRUE(pItem->Write(out));
+    ASSERT_EQ(pItem->GetFixedSize(), out.m_Bytes.size());
+    std::vector<std::uint8_t> put(out.m_Bytes.size() + 1, 0xEE);
+    pItem->WriteFixed(put.data());
+    EXPECT_EQ(put.back(), 0xEE); // nothing past the fixed size
+    put.pop_back();
+    EXPECT_EQ(put, out.m_Bytes);
+  }
+  EXPECT_EQ(kinds.GetFixedSize(), 1u + 2 + 3 + 12 + 28);
+  // Strings, vectors and maps make the size depend on the value.
+  EXPECT_EQ(EventItem().GetFixedSize(), 0u);
+  EXPECT_EQ(FilledMixed().GetFixedSize(), 0u);
 }
 
 TEST(FlowItem, ClearRestoresTheDefaultByteForByte) {

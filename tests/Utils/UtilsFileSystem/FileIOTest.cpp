@@ -1,5 +1,6 @@
 #include "Utils/UtilsFileSystem/FileIO.h"
 #include "Utils/UtilsFileSystem/FileStreams.h"
+#include "Utils/UtilsFileSystem/ReplacingFileStream.h"
 
 #include "DebugServices/LogCapture.h"
 #include "TempDir.h"
@@ -70,10 +71,9 @@ TEST(FileIO, StreamsWriteSeekAndReadBack) {
 }
 
 // After a patch the stream flushes once at the next buffer-sized boundary: the bytes on both
-// sides of that split, by single and gathered writes, land where they were written.
-TEST(FileIO, WritesAfterAPatchSplitAtTheBufferBoundaryKeepEveryByte) {
-  VTempDir dir;
-  const auto path = dir / "patched.bin";
+// sides of that split, by single and gathered writes, land where they were written. Gives the
+// bytes it meant to write.
+std::vector<std::uint8_t> WritePatchedAcrossBoundaries(ZMT::IOutputStreamSeekable& stream) {
   std::vector<std::uint8_t> expected;
   auto bytes = [](std::size_t count, std::uint8_t seed) {
     std::vector<std::uint8_t> out(count);
@@ -81,39 +81,57 @@ TEST(FileIO, WritesAfterAPatchSplitAtTheBufferBoundaryKeepEveryByte) {
       out[i] = static_cast<std::uint8_t>(seed + i * 7);
     return out;
   };
+  expected = bytes(1000, 1);
+  EXPECT_TRUE(stream.Write(expected.data(), expected.size()));
+  // Patch 8 bytes in the middle and go back to the (unaligned) end.
+  EXPECT_TRUE(stream.Seek(100));
+  EXPECT_TRUE(stream.Write("PATCHED!", 8));
+  std::copy_n("PATCHED!", 8, expected.begin() + 100);
+  EXPECT_TRUE(stream.Seek(1000));
+  // Gathered pieces, one of them straddling the first boundary.
+  const auto first = bytes(FullBufferSize - 3000, 2);
+  const auto straddling = bytes(5000, 3);
+  EXPECT_TRUE(stream.Write(
+      ZMT::VGatherList{{first.data(), first.size()}, {straddling.data(), straddling.size()}}));
+  expected.insert(expected.end(), first.begin(), first.end());
+  expected.insert(expected.end(), straddling.begin(), straddling.end());
+  // A second patch, then a single write across the next boundary.
+  EXPECT_TRUE(stream.Seek(FullBufferSize + 10));
+  EXPECT_TRUE(stream.Write("#", 1));
+  expected[FullBufferSize + 10] = '#';
+  EXPECT_TRUE(stream.Seek(static_cast<std::int64_t>(expected.size())));
+  const auto last = bytes(FullBufferSize, 4);
+  EXPECT_TRUE(stream.Write(last.data(), last.size()));
+  expected.insert(expected.end(), last.begin(), last.end());
+  return expected;
+}
+
+std::vector<std::uint8_t> ReadAll(const boost::filesystem::path& path) {
+  std::ifstream in(path.string(), std::ios::binary);
+  return {std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
+}
+
+TEST(FileIO, WritesAfterAPatchSplitAtTheBufferBoundaryKeepEveryByte) {
+  VTempDir dir;
+  const auto plainPath = dir / "patched.bin";
+  const auto replacedPath = dir / "replaced.bin";
+  std::vector<std::uint8_t> plain, replaced;
   {
-    auto [pFile, result] = OpenOutputFile(path, true);
+    auto [pFile, result] = OpenOutputFile(plainPath, true);
     ASSERT_EQ(result, IResult::Ok);
     VFileOutputStreamVirtual stream{VFileOutputStream(pFile)};
-    expected = bytes(1000, 1);
-    ASSERT_TRUE(stream.Write(expected.data(), expected.size()));
-    // Patch 8 bytes in the middle and go back to the (unaligned) end.
-    ASSERT_TRUE(stream.Seek(100));
-    ASSERT_TRUE(stream.Write("PATCHED!", 8));
-    std::copy_n("PATCHED!", 8, expected.begin() + 100);
-    ASSERT_TRUE(stream.Seek(1000));
-    // Gathered pieces, one of them straddling the first boundary.
-    const auto first = bytes(FullBufferSize - 3000, 2);
-    const auto straddling = bytes(5000, 3);
-    ASSERT_TRUE(stream.Write(
-        ZMT::VGatherList{{first.data(), first.size()}, {straddling.data(), straddling.size()}}));
-    expected.insert(expected.end(), first.begin(), first.end());
-    expected.insert(expected.end(), straddling.begin(), straddling.end());
-    // A second patch, then a single write across the next boundary.
-    ASSERT_TRUE(stream.Seek(FullBufferSize + 10));
-    ASSERT_TRUE(stream.Write("#", 1));
-    expected[FullBufferSize + 10] = '#';
-    ASSERT_TRUE(stream.Seek(static_cast<std::int64_t>(expected.size())));
-    const auto last = bytes(FullBufferSize, 4);
-    ASSERT_TRUE(stream.Write(last.data(), last.size()));
-    expected.insert(expected.end(), last.begin(), last.end());
+    plain = WritePatchedAcrossBoundaries(stream);
     ASSERT_EQ(stream.Stream().Close(), IResult::Ok);
   }
-  std::ifstream in(path.string(), std::ios::binary);
-  const std::vector<std::uint8_t> actual((std::istreambuf_iterator<char>(in)),
-                                         std::istreambuf_iterator<char>());
-  ASSERT_EQ(actual.size(), expected.size());
-  EXPECT_TRUE(actual == expected);
+  {
+    VReplacingFile file;
+    ASSERT_TRUE(file.Open(replacedPath).IsSuccess());
+    VReplacingFileStream stream(file);
+    replaced = WritePatchedAcrossBoundaries(stream);
+    ASSERT_TRUE(file.Commit().IsSuccess());
+  }
+  EXPECT_TRUE(ReadAll(plainPath) == plain);
+  EXPECT_TRUE(ReadAll(replacedPath) == replaced);
 }
 
 TEST(FileIO, FailedOpensGiveANullFileAndTheMappedCode) {
