@@ -10,9 +10,12 @@ all: build
 setup:
 	@scripts/setup
 
+# Line tables only (-g1): backtraces keep their file and line, and the build takes about a third
+# less time than with full debug information. Configure with CMAKE_BUILD_TYPE=Debug to step
+# through the code.
 $(BUILD)/CMakeCache.txt:
 	@scripts/setup
-	cmake -S . -B $(BUILD) $(CMAKE_FLAGS)
+	cmake -S . -B $(BUILD) -DCMAKE_CXX_FLAGS_RELWITHDEBINFO="-O2 -g1 -DNDEBUG" $(CMAKE_FLAGS)
 
 configure: $(BUILD)/CMakeCache.txt
 
@@ -31,10 +34,11 @@ test: build
 	cd $(BUILD) && ctest --output-on-failure -j $(JOBS)
 
 # The tests built with AddressSanitizer and UndefinedBehaviorSanitizer: a leak, an overflow or
-# undefined behaviour fails the test that caused it.
+# undefined behaviour fails the test that caused it. -Og compiles the instrumented code in about
+# half the time -O1 takes, for somewhat slower tests.
 SANITIZE = -fsanitize=address,undefined -fno-sanitize-recover=undefined -fno-omit-frame-pointer
 asan: setup
-	cmake -S . -B $(BUILD)-asan -DCMAKE_BUILD_TYPE=Debug -DCMAKE_CXX_FLAGS_DEBUG="-O1 -g1" \
+	cmake -S . -B $(BUILD)-asan -DCMAKE_BUILD_TYPE=Debug -DCMAKE_CXX_FLAGS_DEBUG="-Og -g1" \
 	  -DCMAKE_CXX_FLAGS="$(SANITIZE)" -DCMAKE_EXE_LINKER_FLAGS="$(SANITIZE)" \
 	  -DCMAKE_SHARED_LINKER_FLAGS="$(SANITIZE)" -DCMAKE_MODULE_LINKER_FLAGS="$(SANITIZE)" $(CMAKE_FLAGS)
 	cmake --build $(BUILD)-asan -j $(JOBS)
