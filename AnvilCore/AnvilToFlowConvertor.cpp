@@ -14,7 +14,6 @@
 #include "plugin/host/SubjectManager.h"
 
 namespace Cat = ZMT::Catalogue;
-using AnvilCore::FlowItems::create;
 
 struct AnvilToFlowConvertor::Impl {
   // Camera lookups: the cameras converted, by device URN.
@@ -37,15 +36,15 @@ bool AnvilToFlowConvertor::convertCameras(ZMT::IFlowStoreHandle& io_rStore,
     const OpticalCamera* pCamera = g_db->getOpticalCamera(i);
     if (pCamera->isDV() && !i_video) continue;
     ZMT::IFlowItemHandle hardware, mask;
-    auto* pHardware = create<Cat::VFlowCameraHardware>(io_rStore, hardware);
-    auto* pMask = create<Cat::VFlowCameraMaskGrid>(io_rStore, mask);
+    auto* pHardware = ZMT::CreateFlowItem<Cat::VFlowCameraHardware>(io_rStore, hardware);
+    auto* pMask = ZMT::CreateFlowItem<Cat::VFlowCameraMaskGrid>(io_rStore, mask);
     if (!pHardware || !pMask) return false;
     HCameraConverter::convertOpticalCameraToVCameraHardware(*pCamera, *pHardware);
     HCameraConverter::convertOpticalCameraToVCameraMask(*pCamera, *pMask);
     if (i_calibrations) {
       ZMT::IFlowItemHandle calibration, details;
-      auto* pCalibration = create<Cat::VFlowCameraCalibration>(io_rStore, calibration);
-      auto* pDetails = create<Cat::VFlowCameraCalibrationDetails>(io_rStore, details);
+      auto* pCalibration = ZMT::CreateFlowItem<Cat::VFlowCameraCalibration>(io_rStore, calibration);
+      auto* pDetails = ZMT::CreateFlowItem<Cat::VFlowCameraCalibrationDetails>(io_rStore, details);
       if (!pCalibration || !pDetails) return false;
       // An uncalibrated camera keeps a zero focal length: the lists stay parallel.
       static_cast<CoreOstraTypes::VCameraCalibration&>(*pCalibration) = {};
@@ -66,7 +65,7 @@ bool AnvilToFlowConvertor::convertCameras(ZMT::IFlowStoreHandle& io_rStore,
 
 void AnvilToFlowConvertor::convertVolumeProperties(ZMT::IFlowStoreHandle& io_rStore,
                                                    ZMT::IFlowItemHandle& o_rItem) {
-  auto* pVolume = create<Cat::VFlowVolumeProperties>(io_rStore, o_rItem);
+  auto* pVolume = ZMT::CreateFlowItem<Cat::VFlowVolumeProperties>(io_rStore, o_rItem);
   if (!pVolume) return;
   const HVolumeProperties& volume = g_db->getCalibrationMgr()->getVolumeProperties();
   pVolume->m_MinX = float(volume.m_FloorMinX);
@@ -90,10 +89,10 @@ bool convertSetup(ZMT::IFlowStoreHandle& io_rStore, Character& i_rCharacter, int
   AnvilSubjectCoreTypesConversion conversion(i_mode);
   if (!conversion.characterToVSubject2(&i_rCharacter, false)) return false;
   ZMT::IFlowItemHandle parametrised, subject, application, subspace;
-  auto* pParametrised = create<TParametrised>(io_rStore, parametrised);
-  auto* pSubject = create<TSubject>(io_rStore, subject);
-  auto* pApplication = create<TApplication>(io_rStore, application);
-  auto* pSubspace = create<TSubspace>(io_rStore, subspace);
+  auto* pParametrised = ZMT::CreateFlowItem<TParametrised>(io_rStore, parametrised);
+  auto* pSubject = ZMT::CreateFlowItem<TSubject>(io_rStore, subject);
+  auto* pApplication = ZMT::CreateFlowItem<TApplication>(io_rStore, application);
+  auto* pSubspace = ZMT::CreateFlowItem<TSubspace>(io_rStore, subspace);
   if (!pParametrised || !pSubject || !pApplication || !pSubspace) return false;
   static_cast<CoreOstraTypes::VSubjectParametrised&>(*pParametrised) =
       conversion.getSubjectParametrised();

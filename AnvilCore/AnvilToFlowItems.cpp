@@ -79,7 +79,7 @@ void TakeConverter::build(ZMT::IFlowStoreHandle& io_rStore) {
   m_store = io_rStore;
 
   // Trajectories: every marker of the scene in scene order; the track id is the index.
-  auto* pTable = create<Cat::VFlowParametersItem>(m_store, m_table);
+  auto* pTable = ZMT::CreateFlowItem<Cat::VFlowParametersItem>(m_store, m_table);
   if (pTable) {
     pTable->m_Targets.clear();
     pTable->m_Tags.clear();
@@ -170,9 +170,9 @@ void fillTrajectories(ZMT::IFlowStoreHandle& io_rStore, ZMT::IFlowState& io_rSta
                       const std::vector<std::uint32_t>& i_rTracks,
                       const std::vector<float>& i_rScores) {
   ZMT::IFlowItemHandle set, tracks, labels;
-  auto* pSet = create<TSet>(io_rStore, set);
-  auto* pTracks = create<TTracks>(io_rStore, tracks);
-  auto* pLabels = create<TLabels>(io_rStore, labels);
+  auto* pSet = ZMT::CreateFlowItem<TSet>(io_rStore, set);
+  auto* pTracks = ZMT::CreateFlowItem<TTracks>(io_rStore, tracks);
+  auto* pLabels = ZMT::CreateFlowItem<TLabels>(io_rStore, labels);
   if (!pSet || !pTracks || !pLabels) return;
   pSet->m_GeneratorId = pTracks->m_GeneratorId = pLabels->m_GeneratorId = 0;
   const size_t count = i_rPositions.size();
@@ -209,13 +209,16 @@ void TakeConverter::addSubjectPoses(ZMT::IFlowState& io_rState, std::int64_t i_t
   for (const Subject& subject : m_subjects) {
     ZMT::IFlowItemHandle item;
     if (i_world) {
-      auto* pPose = create<Cat::VFlowSubjectWorldPose>(m_store, item);
+      auto* pPose = ZMT::CreateFlowItem<Cat::VFlowSubjectWorldPose>(m_store, item);
       if (!pPose) return;
       pPose->m_SubjectId = subject.id;
       pPose->m_Segments.resize(subject.bones.size());
-      for (size_t b = 0; b < subject.bones.size(); ++b)
-        pPose->m_Segments[b] =
-            poseOf(subject.bones[b]->getWSRot(i_tick), subject.bones[b]->getWSPos(i_tick));
+      for (size_t b = 0; b < subject.bones.size(); ++b) {
+        Vec3 position;
+        AnvilRotation rotation;
+        subject.bones[b]->getWSTransform(i_tick, position, rotation);
+        pPose->m_Segments[b] = poseOf(rotation, position);
+      }
       pPose->m_Markers.resize(subject.markers.size());
       for (size_t m = 0; m < subject.markers.size(); ++m) {
         const Marker* pMarker = subject.markers[m];
@@ -228,7 +231,7 @@ void TakeConverter::addSubjectPoses(ZMT::IFlowState& io_rState, std::int64_t i_t
         pPose->m_Markers[m] = {p.x, p.y, p.z};
       }
     } else {
-      auto* pPose = create<Cat::VFlowSubjectLocalPose>(m_store, item);
+      auto* pPose = ZMT::CreateFlowItem<Cat::VFlowSubjectLocalPose>(m_store, item);
       if (!pPose) return;
       pPose->m_SubjectId = subject.id;
       pPose->m_Segments.resize(subject.bones.size());
@@ -244,7 +247,7 @@ void TakeConverter::addCentroids(ZMT::IFlowState& io_rState, std::int64_t) {
   // The camera looks down its -Z axis with +Y up; image rows grow downwards.
   for (const Camera& camera : m_cameras) {
     ZMT::IFlowItemHandle item;
-    auto* pSet = create<Cat::VFlowCentroidSet>(m_store, item);
+    auto* pSet = ZMT::CreateFlowItem<Cat::VFlowCentroidSet>(m_store, item);
     if (!pSet) return;
     pSet->m_DeviceURN = camera.urn;
     pSet->m_GeneratorId = 0;
@@ -275,7 +278,7 @@ void TakeConverter::addCentroids(ZMT::IFlowState& io_rState, std::int64_t) {
 
 void TakeConverter::addOrientation(ZMT::IFlowState& io_rState) {
   if (!m_orientation) {
-    auto* pOrientation = create<Cat::VFlowSceneOrientation>(m_store, m_orientation);
+    auto* pOrientation = ZMT::CreateFlowItem<Cat::VFlowSceneOrientation>(m_store, m_orientation);
     if (!pOrientation) return;
     // Z up is the identity; Y up turns world Z onto Y, a quarter turn about -X.
     const double h = std::sqrt(0.5);

@@ -2,10 +2,10 @@
 // The host's side of turning a take into Flow items, frame by frame: what the convertor keeps for
 // the whole take (the markers in scene order, the subjects' bones, the cameras, the items every
 // frame shares) so that each frame only reads keys and fills pooled items.
+#include "Flow2/Flow2Types/CreateFlowItem.h"
 #include "Flow2/Flow2Types/IFlowHandles.h"
 #include "Flow2/Flow2Types/IFlowState.h"
 #include "Flow2/Flow2Types/IFlowStore.h"
-#include "Flow2/Flow2Types/VFlowItem.h"
 #include <cstdint>
 #include <memory>
 #include <string>
@@ -16,14 +16,6 @@ class OpticalCamera;
 class SubjectBone;
 
 namespace AnvilCore::FlowItems {
-
-/// A new item of a catalogued type in the store, or null when the store lacks the type.
-template <class T> T* create(ZMT::IFlowStoreHandle& io_rStore, ZMT::IFlowItemHandle& o_rItem) {
-  // The type's own record: no copy of its name per item.
-  const ZMT::IFlowItemTypeInfo& info = ZMT::Detail::FlowTypeStatics<T>().m_TypeInfo;
-  if (!io_rStore || io_rStore->CreateItem(info, o_rItem).IsFailure()) return nullptr;
-  return o_rItem.As<ZMT::Detail::VFlowItem<T>>();
-}
 
 /// The label a trajectory is recorded under: "Subject:Marker" for a marker of a top-level
 /// character, its own name otherwise.

@@ -68,6 +68,10 @@ AnvilRotation Node::getWSRot(HTime i_t) const {
   return rot;
 }
 
+void Node::getWSTransform(HTime i_t, Vec3& o_rPos, AnvilRotation& o_rRot) const {
+  worldTransform(i_t, false, o_rPos, o_rRot);
+}
+
 Vec3 Node::getConstWSPos() const {
   Vec3 pos;
   AnvilRotation rot;
@@ -89,6 +93,11 @@ Vec3 Marker::getWSPos(HTime i_t) const {
   Vec3 pos = m_track.evaluate(i_t, Vec3());
   AnvilCoreImpl::applySceneRotation(pos);
   return pos;
+}
+
+void Marker::getWSTransform(HTime i_t, Vec3& o_rPos, AnvilRotation& o_rRot) const {
+  Node::getWSTransform(i_t, o_rPos, o_rRot);
+  if (!m_track.isEmpty()) o_rPos = getWSPos(i_t);
 }
 
 Vec3 Marker::getWSKeyPos(int i_index) const {

@@ -7,6 +7,7 @@
 #include "AnvilCore/demo/DemoScene.h"
 #include "AnvilCore/io/ISceneReader.h"
 #include "LongTake.h"
+#include "PlainFwrite.h"
 #include "RatioReporter.h"
 #include "exporters/mcp/AnvilMCPExporter.h"
 #include "exporters/trajectory/C3DExporter.h"
@@ -74,15 +75,7 @@ void BM_McpExport(benchmark::State& state) {
 
 // The floor: the file's size in one fwrite.
 void BM_PlainFwrite(benchmark::State& state) {
-  std::vector<uint8_t> bytes(s_bytes, 1);
-  const std::string path = tempOutput(".raw");
-  for (auto _ : state) {
-    FILE* pFile = std::fopen(path.c_str(), "wb");
-    std::fwrite(bytes.data(), 1, bytes.size(), pFile);
-    std::fclose(pFile);
-  }
-  state.SetBytesProcessed(int64_t(state.iterations()) * int64_t(s_bytes));
-  std::filesystem::remove(path);
+  plainFwrite(state, s_bytes);
 }
 
 // Reading a recording into a fresh scene, through the reader `anvil` uses for its extension.

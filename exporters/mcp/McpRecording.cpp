@@ -1,6 +1,7 @@
 #include "McpRecording.h"
 #include "Flow2/Flow2File/VWriter.h"
 #include "Flow2/Flow2Store/VFlowStoreFactory.h"
+#include "Flow2/Flow2Types/CreateFlowItem.h"
 #include "Flow2/Flow2Types/FlowCatalogue.h"
 #include "Utils/UtilsFileSystem/ReplacingFileStream.h"
 #include "plugin/host/AnvilToFlowConvertor.h"
@@ -17,12 +18,8 @@ void addTimecode(ZMT::IFlowStoreHandle& io_rStore, ZMT::IFlowState& io_rState,
   const ZMT::ITimecode<135000000> timecode = i_rTime.getTimecode(i_clipTime);
   if (!timecode.isValid()) return;
   ZMT::IFlowItemHandle item;
-  if (io_rStore
-          ->CreateItem(ZMT::Detail::FlowTypeStatics<ZMT::Catalogue::VFlowTimecode>().m_TypeInfo,
-                       item)
-          .IsFailure())
-    return;
-  auto* pTimecode = item.As<ZMT::Detail::VFlowItem<ZMT::Catalogue::VFlowTimecode>>();
+  auto* pTimecode = ZMT::CreateFlowItem<ZMT::Catalogue::VFlowTimecode>(io_rStore, item);
+  if (!pTimecode) return;
   static_cast<ZMT::ITimecode<135000000>&>(*pTimecode) = timecode;
   io_rState.AddItem(item, io_rState.GetTime());
 }

@@ -30,6 +30,7 @@ public:
   /// The track's value at t (interpolated in gaps, held outside the keys) in the scene's current
   /// orientation. A marker without keys falls back to its node transform.
   Vec3 getWSPos(HTime i_t) const override;
+  void getWSTransform(HTime i_t, Vec3& o_rPos, AnvilRotation& o_rRot) const override;
   /// The value of key `i_index` of `m_track` in the scene's current orientation: what
   /// `getWSPos` gives at that key's time, without searching for it.
   Vec3 getWSKeyPos(int i_index) const;

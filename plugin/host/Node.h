@@ -30,6 +30,8 @@ public:
 
   virtual Vec3 getWSPos(HTime i_t) const;
   virtual AnvilRotation getWSRot(HTime i_t) const;
+  /// World position and rotation together, at the cost of one walk up the parents.
+  virtual void getWSTransform(HTime i_t, Vec3& o_rPos, AnvilRotation& o_rRot) const;
   Vec3 getLocalPos(HTime i_t) const;
   AnvilRotation getLocalRot(HTime i_t) const;
   Vec3 getLocalScale(HTime i_t) const;

@@ -145,6 +145,18 @@ TEST(HostTransforms, TracksInterpolateAndHoldEnds) {
   EXPECT_TRUE(pMarker->m_track.hasKeyAt(2 * tpf, index));
   EXPECT_EQ(index, 1);
   expectNear(pMarker->getWSPos(tpf), Vec3(1, 2, 3));
+  // The one-walk form answers exactly what the two calls do, for a node and a tracked marker.
+  for (const Node* pWhich : {static_cast<const Node*>(pNode), static_cast<const Node*>(pMarker)}) {
+    Vec3 position;
+    AnvilRotation rotation;
+    pWhich->getWSTransform(3 * tpf, position, rotation);
+    EXPECT_EQ(position, pWhich->getWSPos(3 * tpf));
+    double q[2][4];
+    rotation.getAsQuaternion(q[0][0], q[0][1], q[0][2], q[0][3]);
+    pWhich->getWSRot(3 * tpf).getAsQuaternion(q[1][0], q[1][1], q[1][2], q[1][3]);
+    for (int i = 0; i < 4; ++i)
+      EXPECT_EQ(q[0][i], q[1][i]);
+  }
   int first = -1;
   EXPECT_EQ(pMarker->m_track.getKeysInRange(HTimeRange(tpf, 5 * tpf), first), 1);
   EXPECT_EQ(first, 1);

@@ -8,6 +8,7 @@
 #include "Flow2/Flow2File/VReader.h"
 #include "Flow2/Flow2File/VWriter.h"
 #include "Flow2/Flow2Store/VFlowStoreFactory.h"
+#include "Flow2/Flow2Types/CreateFlowItem.h"
 #include "Utils/UtilsFileSystem/MemoryStreams.h"
 
 #include <gtest/gtest.h>
@@ -59,8 +60,7 @@ struct VSide {
   }
   template <class T> ZMT::IFlowItemHandle Create() {
     ZMT::IFlowItemHandle item;
-    EXPECT_TRUE(
-        m_Store->CreateItem(ZMT::Detail::FlowTypeStatics<T>().m_TypeInfo, item).IsSuccess());
+    EXPECT_NE(ZMT::CreateFlowItem<T>(m_Store, item), nullptr);
     return item;
   }
   ZMT::IFlowStateHandle State(std::int64_t frame, std::uint32_t session = 1) {

@@ -1,6 +1,7 @@
 // The value-only evaluation against a parse through VMathFactorySimple: the same value to the bit
 // and the same message, for good and bad texts alike.
 
+#include "../../support/RandomDecimalText.h"
 #include "River/CoreOstraTypesUtils/MathParser.h"
 #include "River/CoreOstraTypesUtils/VMathFactorySimple.h"
 
@@ -123,13 +124,7 @@ TEST(ValueParse, PlainNumbersReadAsTheGrammarReadsThem) {
     EXPECT_EQ(std::memcmp(&number, &digits, sizeof(double)), 0) << text;
   };
   for (int i = 0; i < 20000; ++i) {
-    const int digits = 1 + static_cast<int>(random() % 16);
-    const int point = static_cast<int>(random() % static_cast<unsigned>(digits + 1));
-    std::string text = random() % 2 ? "-" : "";
-    for (int d = 0; d < digits; ++d) {
-      if (d == point) text += '.';
-      text += static_cast<char>('0' + random() % 10);
-    }
+    std::string text = TestSupport::randomDecimalText(random, 16);
     if (random() % 4 == 0) text += '.';
     expectStrtod(text);
   }

@@ -1,4 +1,5 @@
 #include "Utils/UtilsText/ShortDecimal.h"
+#include "../../support/RandomDecimalText.h"
 
 #include <gtest/gtest.h>
 
@@ -35,13 +36,7 @@ TEST(ShortDecimal, TakesOnlyWhatItCanReadExactly) {
 TEST(ShortDecimal, GivesStrtodsValueBitForBit) {
   std::mt19937_64 random(11);
   for (int i = 0; i < 50000; ++i) {
-    const int digits = 1 + static_cast<int>(random() % 15);
-    const int point = static_cast<int>(random() % static_cast<unsigned>(digits + 1));
-    std::string text = random() % 2 ? "-" : "";
-    for (int d = 0; d < digits; ++d) {
-      if (d == point) text += '.';
-      text += static_cast<char>('0' + random() % 10);
-    }
+    const std::string text = TestSupport::randomDecimalText(random, 15);
     double value = 0.0;
     ASSERT_TRUE(ParseShortDecimal(text, value)) << text;
     const double expected = std::strtod(text.c_str(), nullptr);
