@@ -222,9 +222,14 @@ void CompareNode(const ISchema& a, const ISchema& b, const std::string& path,
     break;
   }
   const std::size_t n = std::min(a.m_Members.size(), b.m_Members.size());
-  for (std::size_t i = 0; i < n; ++i)
-    CompareNode(a.m_Members[i].m_Schema, b.m_Members[i].m_Schema,
-                Join(where, "[" + std::to_string(i) + "]"), o_rErrors, o_rWarnings, depth + 1);
+  for (std::size_t i = 0; i < n; ++i) {
+    // Built by appending: GCC 12 warns falsely (-Wrestrict) on "[" + std::to_string(i).
+    std::string index(1, '[');
+    index += std::to_string(i);
+    index += ']';
+    CompareNode(a.m_Members[i].m_Schema, b.m_Members[i].m_Schema, Join(where, index), o_rErrors,
+                o_rWarnings, depth + 1);
+  }
 }
 } // namespace
 
